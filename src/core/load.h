@@ -1,0 +1,25 @@
+// The load-time entry and the informational processor-feature flag it sets.
+#ifndef ZELCV_CORE_LOAD_H
+#define ZELCV_CORE_LOAD_H
+
+#include <stdint.h>
+
+namespace zelcv {
+
+enum LoadReason : uint32_t {
+  kProcessDetach = 0,
+  kProcessAttach = 1,
+  kThreadAttach = 2,
+  kThreadDetach = 3,
+};
+
+// Acts on process attach only; returns true for every reason.
+int onLibraryLoad(void* module, uint32_t reason, void* reserved);
+
+// 1 when the processor reported both feature bits 0x10 and 0x20 at load.
+// Informational: no operation consults it.
+int cpuFeatureFlag();
+
+}  // namespace zelcv
+
+#endif  // ZELCV_CORE_LOAD_H
