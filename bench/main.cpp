@@ -1,0 +1,125 @@
+// zelcv-bench: zelcv against OpenCV on identical inputs, single-threaded.
+//   zelcv-bench [--benchmark_filter=REGEX] [other Google Benchmark flags]
+#include <cmath>
+#include <cstdio>
+#include <cstring>
+#include <map>
+#include <string>
+#include <vector>
+
+#include <opencv2/core.hpp>
+#include <opencv2/imgproc.hpp>
+
+#include "harness.h"
+
+namespace zelbench {
+
+namespace {
+std::vector<void (*)()>& families() {
+  static std::vector<void (*)()> list;
+  return list;
+}
+}  // namespace
+
+Registrar::Registrar(void (*registerFamily)()) { families().push_back(registerFamily); }
+
+cv::Mat naturalImage(int width, int height, uint32_t seed) {
+  cv::Mat image(height, width, CV_8UC1, cv::Scalar(90));
+  cv::RNG rng(seed);
+  for (int i = 0; i < 40; ++i) {
+    cv::Point centre(rng.uniform(0, width), rng.uniform(0, height));
+    int radius = rng.uniform(width / 40 + 1, width / 6 + 2);
+    cv::circle(image, centre, radius, cv::Scalar(rng.uniform(0, 256)), cv::FILLED, cv::LINE_AA);
+  }
+  cv::GaussianBlur(image, image, cv::Size(5, 5), 1.5);
+  cv::Mat noise(height, width, CV_8UC1);
+  rng.fill(noise, cv::RNG::NORMAL, 0, 6);
+  cv::add(image, noise, image, cv::noArray(), CV_8U);
+  return image;
+}
+
+namespace {
+
+// The copy bandwidth: the physical limit of a streaming operation.
+void registerBaseline() {
+  for (const Size& s : kSizes) {
+    benchmark::RegisterBenchmark((std::string("baseline/copy/") + s.name).c_str(),
+                                 [s](benchmark::State& state) {
+                                   std::vector<uint8_t> a(size_t(s.width) * s.height * 4, 1), b(a.size());
+                                   for (auto _ : state) {
+                                     std::memcpy(b.data(), a.data(), a.size());
+                                     benchmark::ClobberMemory();
+                                   }
+                                   // Bytes read plus bytes written.
+                                   state.SetBytesProcessed(int64_t(state.iterations()) * 2 * a.size());
+                                 })
+        ->Unit(benchmark::kMicrosecond);
+  }
+}
+
+struct Result {
+  double microseconds = 0;
+  double bytesPerSecond = 0;
+};
+
+// Collects results while printing the usual console lines.
+class PairingReporter : public benchmark::ConsoleReporter {
+ public:
+  void ReportRuns(const std::vector<Run>& runs) override {
+    ConsoleReporter::ReportRuns(runs);
+    for (const Run& run : runs) {
+      if (run.run_type != Run::RT_Iteration || run.error_occurred) continue;
+      Result r;
+      r.microseconds = run.GetAdjustedRealTime();
+      auto bytes = run.counters.find("bytes_per_second");
+      if (bytes != run.counters.end()) r.bytesPerSecond = bytes->second;
+      results[run.benchmark_name()] = r;
+    }
+  }
+  std::map<std::string, Result> results;
+};
+
+void printTable(const std::map<std::string, Result>& results) {
+  std::map<std::string, double> copyBandwidth;  // by size name
+  for (const auto& [name, r] : results)
+    if (name.rfind("baseline/copy/", 0) == 0) copyBandwidth[name.substr(14)] = r.bytesPerSecond;
+
+  std::printf("\n%-52s %12s %12s %7s %9s %6s\n", "case", "zelcv us", "opencv us", "ratio",
+              "zelcv GB/s", "%copy");
+  int slower = 0;
+  for (const auto& [name, r] : results) {
+    const std::string suffix = "/zelcv";
+    if (name.size() <= suffix.size() || name.compare(name.size() - suffix.size(), suffix.size(), suffix) != 0)
+      continue;
+    std::string base = name.substr(0, name.size() - suffix.size());
+    auto other = results.find(base + "/opencv");
+    if (other == results.end()) continue;
+    double ratio = r.microseconds / other->second.microseconds;
+    if (ratio > 1.0) ++slower;
+    std::printf("%-52s %12.1f %12.1f %7.2f", base.c_str(), r.microseconds, other->second.microseconds, ratio);
+    if (r.bytesPerSecond > 0) {
+      std::printf(" %9.2f", r.bytesPerSecond / 1e9);
+      for (const auto& [size, bw] : copyBandwidth)
+        if (base.find(size) != std::string::npos && bw > 0) std::printf(" %5.0f%%", 100.0 * r.bytesPerSecond / bw);
+    }
+    std::printf("\n");
+  }
+  std::printf("\nratio = zelcv time / OpenCV time (below 1.0: zelcv faster); %d case(s) slower\n", slower);
+}
+
+}  // namespace
+}  // namespace zelbench
+
+int main(int argc, char** argv) {
+  cv::setNumThreads(1);
+  cv::setUseOptimized(true);
+  zelbench::registerBaseline();
+  for (auto registerFamily : zelbench::families()) registerFamily();
+  benchmark::Initialize(&argc, argv);
+  if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 1;
+  zelbench::PairingReporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+  zelbench::printTable(reporter.results);
+  benchmark::Shutdown();
+  return 0;
+}
