@@ -1,0 +1,103 @@
+// The SIMD abstraction every kernel is written against: 128-bit SSE2 vectors
+// typed by element, so that one template serves 8u, 8s, 16u, 16s, 32s and 32f.
+// SSE2 is the baseline on both x86 targets; nothing here needs more.
+#ifndef ZELCV_KERNELS_SIMD_H
+#define ZELCV_KERNELS_SIMD_H
+
+#include <emmintrin.h>
+#include <stddef.h>
+#include <stdint.h>
+
+namespace zelcv {
+namespace simd {
+
+constexpr int kBytes = 16;
+
+template <typename T> struct Vec;
+
+// Integer vectors share loads and stores.
+struct IntegerVec {
+  using Raw = __m128i;
+  static Raw loadu(const void* p) { return _mm_loadu_si128(static_cast<const __m128i*>(p)); }
+  static Raw load(const void* p) { return _mm_load_si128(static_cast<const __m128i*>(p)); }
+  static void storeu(void* p, Raw v) { _mm_storeu_si128(static_cast<__m128i*>(p), v); }
+  static void store(void* p, Raw v) { _mm_store_si128(static_cast<__m128i*>(p), v); }
+  // Non-temporal store; `p` must be 16-byte aligned.
+  static void stream(void* p, Raw v) { _mm_stream_si128(static_cast<__m128i*>(p), v); }
+};
+
+template <> struct Vec<uint8_t> : IntegerVec {
+  static constexpr int kLanes = 16;
+  static Raw set1(uint8_t v) { return _mm_set1_epi8(static_cast<char>(v)); }
+  static Raw min(Raw a, Raw b) { return _mm_min_epu8(a, b); }
+  static Raw max(Raw a, Raw b) { return _mm_max_epu8(a, b); }
+};
+
+template <> struct Vec<int8_t> : IntegerVec {
+  static constexpr int kLanes = 16;
+  static Raw set1(int8_t v) { return _mm_set1_epi8(v); }
+  // SSE2 has no signed byte min/max: flip the sign bit, use the unsigned ones.
+  static Raw min(Raw a, Raw b) { return flip(_mm_min_epu8(flip(a), flip(b))); }
+  static Raw max(Raw a, Raw b) { return flip(_mm_max_epu8(flip(a), flip(b))); }
+  static Raw flip(Raw a) { return _mm_xor_si128(a, _mm_set1_epi8(static_cast<char>(0x80))); }
+};
+
+template <> struct Vec<int16_t> : IntegerVec {
+  static constexpr int kLanes = 8;
+  static Raw set1(int16_t v) { return _mm_set1_epi16(v); }
+  static Raw min(Raw a, Raw b) { return _mm_min_epi16(a, b); }
+  static Raw max(Raw a, Raw b) { return _mm_max_epi16(a, b); }
+};
+
+template <> struct Vec<uint16_t> : IntegerVec {
+  static constexpr int kLanes = 8;
+  static Raw set1(uint16_t v) { return _mm_set1_epi16(static_cast<short>(v)); }
+  // SSE2 has only signed 16-bit min/max: a - sat(a - b) and b + sat(a - b).
+  static Raw min(Raw a, Raw b) { return _mm_sub_epi16(a, _mm_subs_epu16(a, b)); }
+  static Raw max(Raw a, Raw b) { return _mm_add_epi16(b, _mm_subs_epu16(a, b)); }
+};
+
+template <> struct Vec<int32_t> : IntegerVec {
+  static constexpr int kLanes = 4;
+  static Raw set1(int32_t v) { return _mm_set1_epi32(v); }
+  static Raw min(Raw a, Raw b) {
+    Raw lt = _mm_cmplt_epi32(a, b);
+    return _mm_or_si128(_mm_and_si128(lt, a), _mm_andnot_si128(lt, b));
+  }
+  static Raw max(Raw a, Raw b) {
+    Raw gt = _mm_cmpgt_epi32(a, b);
+    return _mm_or_si128(_mm_and_si128(gt, a), _mm_andnot_si128(gt, b));
+  }
+};
+
+template <> struct Vec<float> {
+  using Raw = __m128;
+  static constexpr int kLanes = 4;
+  static Raw loadu(const void* p) { return _mm_loadu_ps(static_cast<const float*>(p)); }
+  static Raw load(const void* p) { return _mm_load_ps(static_cast<const float*>(p)); }
+  static void storeu(void* p, Raw v) { _mm_storeu_ps(static_cast<float*>(p), v); }
+  static void store(void* p, Raw v) { _mm_store_ps(static_cast<float*>(p), v); }
+  static void stream(void* p, Raw v) { _mm_stream_ps(static_cast<float*>(p), v); }
+  static Raw set1(float v) { return _mm_set1_ps(v); }
+  static Raw min(Raw a, Raw b) { return _mm_min_ps(a, b); }
+  static Raw max(Raw a, Raw b) { return _mm_max_ps(a, b); }
+};
+
+// Elements to process one by one before `p` reaches a 16-byte boundary
+// (capped at n).
+template <typename T>
+inline int elementsToAlignment(const T* p, int n) {
+  int misalignment = static_cast<int>(reinterpret_cast<uintptr_t>(p) & (kBytes - 1));
+  int head = misalignment == 0 ? 0 : (kBytes - misalignment) / static_cast<int>(sizeof(T));
+  // A pointer not aligned to its own element size never reaches the boundary.
+  if (misalignment % static_cast<int>(sizeof(T)) != 0) head = n;
+  return head < n ? head : n;
+}
+
+// Makes non-temporal stores visible before returning to the caller.
+inline void storeFence() { _mm_sfence(); }
+
+}  // namespace simd
+}  // namespace zelcv
+
+#endif  // ZELCV_KERNELS_SIMD_H
