@@ -1,0 +1,318 @@
+#include "morph/morph_core.h"
+
+#include <string.h>
+
+#include <algorithm>
+
+#include "core/alloc.h"
+#include "filter/border.h"
+#include "kernels/minmax.h"
+
+namespace zelcv {
+namespace morph {
+
+namespace {
+
+using minmax::MaxOp;
+using minmax::MinOp;
+
+template <typename T>
+const T* rowAt(const T* base, int step, int r) {
+  return reinterpret_cast<const T*>(reinterpret_cast<const uint8_t*>(base) + int64_t(r) * step);
+}
+template <typename T>
+T* rowAt(T* base, int step, int r) {
+  return reinterpret_cast<T*>(reinterpret_cast<uint8_t*>(base) + int64_t(r) * step);
+}
+
+int clampInt(int v, int lo, int hi) { return v < lo ? lo : (v > hi ? hi : v); }
+
+// Windows reaching more than one image size past an edge see only the edge
+// pixel: clip the window [s, s + K - 1] to [-(n - 1), n - 1].
+void clipWindow(int& s, int& K, int n) {
+  int e = clampInt(s + K - 1, -(n - 1), n - 1);
+  s = clampInt(s, -(n - 1), n - 1);
+  K = e - s + 1;
+}
+
+// Whether the destination rows may overwrite source rows still to be read.
+bool overlaps(const void* src, int srcStep, const void* dst, int dstStep, int height, size_t rowBytes) {
+  const uint8_t* s = static_cast<const uint8_t*>(src);
+  const uint8_t* d = static_cast<const uint8_t*>(dst);
+  const uint8_t* sEnd = s + int64_t(srcStep) * (height - 1) + rowBytes;
+  const uint8_t* dEnd = d + int64_t(dstStep) * (height - 1) + rowBytes;
+  return s < dEnd && d < sEnd;
+}
+
+// Row slots in the work memory, each a 32-aligned row of the ROI.
+template <typename T>
+struct Slots {
+  uint8_t* base;
+  size_t stride;
+  T* operator[](int i) const { return reinterpret_cast<T*>(base + size_t(i) * stride); }
+};
+template <typename T>
+Slots<T> makeSlots(uint8_t* work, int width, int channels) {
+  return {alignUp(work, 32), size_t(alignSize(int64_t(width) * channels * sizeof(T), 32))};
+}
+
+// The rectangle: horizontal window maxima per source row into row slots,
+// then the vertical window over those rows: a direct ring for heights 1, 3
+// and 5, otherwise the van Herk / Gil-Werman scheme (blocks of Kv rows with
+// suffix maxima inside the block and prefix maxima of the next one), whose
+// cost per pixel does not depend on the height.
+template <typename T, typename Op>
+void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, int rw, int rh, int ox,
+              int oy, uint8_t* work) {
+  int s = -ox, K = rw, sv = -oy, Kv = rh;
+  clipWindow(s, K, W);
+  clipWindow(sv, Kv, H);
+  const int n = W * c;
+  const bool inPlace = overlaps(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(n));
+  const Slots<T> slot = makeSlots<T>(work, W, c);
+  // A window wholly above its output row is streamed bottom-up, so that in
+  // place no row is overwritten before it is read.
+  const bool up = sv + Kv - 1 < 0;
+  auto extRow = [&](int k) { return rowAt(src, srcStep, clampInt(up ? H + sv + Kv - 2 - k : sv + k, 0, H - 1)); };
+  auto outRow = [&](int m) { return rowAt(dst, dstStep, up ? H - 1 - m : m); };
+  auto hpass = [&](int k, T* out) { minmax::windowRow<T, Op>(extRow(k), out, W, c, s, K); };
+  const int steps = H + Kv - 1;
+
+  if (Kv == 1) {
+    for (int m = 0; m < H; ++m) {
+      if (!inPlace) {
+        hpass(m, outRow(m));
+      } else {
+        hpass(m, slot[0]);
+        memcpy(outRow(m), slot[0], sizeof(T) * size_t(n));
+      }
+    }
+    return;
+  }
+  if ((Kv == 3 || Kv == 5) && 2 * Kv <= H) {
+    const T* rows[5];
+    for (int k = 0; k < steps; ++k) {
+      hpass(k, slot[k % Kv]);
+      if (k < Kv - 1) continue;
+      for (int i = 0; i < Kv; ++i) rows[i] = slot[i];
+      if (Kv == 3)
+        minmax::combineRowsFixed<3, T, Op>(outRow(k - Kv + 1), rows, n);
+      else
+        minmax::combineRowsFixed<5, T, Op>(outRow(k - Kv + 1), rows, n);
+    }
+    return;
+  }
+  for (int k = 0; k < steps; ++k) {
+    const int b = k / Kv, q = k % Kv;
+    const int hg = (b & 1) * Kv, sg = Kv - hg;  // this block's rows, the previous block's
+    T* h = slot[hg + q];
+    hpass(k, h);
+    if (q == Kv - 1) {
+      for (int i = Kv - 2; i >= 0; --i) minmax::combineForward<T, Op>(slot[hg + i], slot[hg + i], slot[hg + i + 1], n);
+      memcpy(outRow(k - Kv + 1), slot[hg], sizeof(T) * size_t(n));
+    } else if (b > 0) {
+      // The prefix of this block so far takes the slot of the previous
+      // block's suffix row q, used by the step before (row 0 at the block end).
+      T* prefix = slot[sg + q];
+      if (q == 0)
+        memcpy(prefix, h, sizeof(T) * size_t(n));
+      else
+        minmax::combineForward<T, Op>(prefix, slot[sg + q - 1], h, n);
+      minmax::combineForward<T, Op>(outRow(k - Kv + 1), slot[sg + q + 1], prefix, n);
+    }
+  }
+}
+
+// Kind 2: per source row, the horizontal maxima of the distinct runs; per
+// output row, the maximum of the run rows that the element's rows select.
+template <typename T, typename Op>
+void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, const View& v,
+              uint8_t* work) {
+  const RowEntry* rows = v.rows;
+  const int rowCount = v.shape.rowCount, runCount = v.shape.runCount;
+  const int dyMin = rows[0].dy, dyMax = rows[rowCount - 1].dy, span = dyMax - dyMin + 1;
+  const int n = W * c;
+  const bool inPlace = overlaps(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(n));
+  const T** pointers = reinterpret_cast<const T**>(alignUp(work, 16));
+  const Slots<T> slot = makeSlots<T>(work + 16 + sizeof(void*) * size_t(rowCount), W, c);
+  auto srcRow = [&](int r) { return rowAt(src, srcStep, clampInt(r, 0, H - 1)); };
+  // A single-pixel run at the anchor is the source row itself.
+  auto aliased = [&](int j) { return !inPlace && v.runs[j].start == 0 && v.runs[j].end == 0; };
+  for (int r = dyMin; r <= H - 1 + dyMax; ++r) {
+    const int g = (r - dyMin) % span;
+    for (int j = 0; j < runCount; ++j) {
+      if (aliased(j)) continue;
+      int s = v.runs[j].start, K = v.runs[j].end - v.runs[j].start + 1;
+      clipWindow(s, K, W);
+      minmax::windowRow<T, Op>(srcRow(r), slot[g * runCount + j], W, c, s, K);
+    }
+    const int y = r - dyMax;
+    if (y < 0) continue;
+    for (int i = 0; i < rowCount; ++i) {
+      const int rr = y + rows[i].dy, j = rows[i].run;
+      pointers[i] = aliased(j) ? srcRow(rr) : slot[((rr - dyMin) % span) * runCount + j];
+    }
+    minmax::combineRows<T, Op>(rowAt(dst, dstStep, y), pointers, rowCount, n);
+  }
+}
+
+// Any element and any border: the maximum over every on element, reading
+// rows beyond the ROI from memory on flagged sides and replicating the edge
+// elsewhere. In place, the ROI rows still needed are kept in a ring.
+template <typename T, typename Op>
+void generalCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, ZeliBorderType border,
+                 const View& v, uint8_t* work) {
+  const int mw = v.maskWidth, mh = v.maskHeight, ax = v.anchorX, ay = v.anchorY;
+  const int n = W * c;
+  const bool inPlace = overlaps(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(n));
+  const Slots<T> ring = makeSlots<T>(work, W, c);
+  const bool top = inMemoryTop(border), bottom = inMemoryBottom(border);
+  const bool left = inMemoryLeft(border), right = inMemoryRight(border);
+  int loaded = 0;
+  for (int y = 0; y < H; ++y) {
+    if (inPlace)
+      for (int last = std::min(H - 1, y + mh - 1 - ay); loaded <= last; ++loaded)
+        memcpy(ring[loaded % mh], rowAt(src, srcStep, loaded), sizeof(T) * size_t(n));
+    T* acc = rowAt(dst, dstStep, y);
+    bool first = true;
+    for (int j = 0; j < mh; ++j) {
+      const int r = y + j - ay;
+      const T* mem;
+      const T* roi;
+      if ((r < 0 && top) || (r >= H && bottom)) {
+        roi = mem = rowAt(src, srcStep, r);
+      } else {
+        const int rc = clampInt(r, 0, H - 1);
+        mem = rowAt(src, srcStep, rc);
+        roi = inPlace ? ring[rc % mh] : mem;
+      }
+      const uint8_t* m = v.mask + int64_t(j) * mw;
+      for (int i = 0; i < mw; ++i) {
+        if (!m[i]) continue;
+        if (first)
+          minmax::combineShifted<T, Op, true>(acc, W, c, roi, mem, left, right, i - ax);
+        else
+          minmax::combineShifted<T, Op, false>(acc, W, c, roi, mem, left, right, i - ax);
+        first = false;
+      }
+    }
+  }
+}
+
+template <typename T>
+void copyRows(const T* src, int srcStep, T* dst, int dstStep, int H, size_t rowBytes) {
+  if (src == dst) return;
+  for (int y = 0; y < H; ++y) memmove(rowAt(dst, dstStep, y), rowAt(src, srcStep, y), rowBytes);
+}
+
+template <typename T, typename Op>
+void applyWith(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int c, ZeliBorderType border,
+               const View& v, uint8_t* work) {
+  const int W = roi.width, H = roi.height;
+  if (borderKind(border) == zelBorderInMemory) border = zelBorderReplicate | 0xF0;
+  const bool flags = (border & 0xF0) != 0;
+  if (v.kind == kEmpty)
+    copyRows(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(W) * c);
+  else if (v.kind == kRectangle && !flags)
+    rectCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, v.shape.rectWidth, v.shape.rectHeight,
+                    v.shape.rectOffsetX, v.shape.rectOffsetY, work);
+  else if (v.kind == kRuns && !flags)
+    runsCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, v, work);
+  else
+    generalCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, border, v, work);
+}
+
+int bitAt(const uint8_t* row, int64_t position) {
+  return (row[position >> 3] >> (7 - (position & 7))) & 1;
+}
+
+}  // namespace
+
+template <typename T>
+void rectFilter(bool max, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels, int rw,
+                int rh, int ox, int oy, uint8_t* work) {
+  if (max)
+    rectCore<T, MaxOp<T>>(src, srcStep, dst, dstStep, roi.width, roi.height, channels, rw, rh, ox, oy, work);
+  else
+    rectCore<T, MinOp<T>>(src, srcStep, dst, dstStep, roi.width, roi.height, channels, rw, rh, ox, oy, work);
+}
+
+template <typename T>
+void apply(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels,
+           ZeliBorderType border, const View& state, uint8_t* work) {
+  if (dilate)
+    applyWith<T, MaxOp<T>>(src, srcStep, dst, dstStep, roi, channels, border, state, work);
+  else
+    applyWith<T, MinOp<T>>(src, srcStep, dst, dstStep, roi, channels, border, state, work);
+}
+
+#define ZELCV_MORPH_INSTANTIATE(T)                                                                  \
+  template void rectFilter<T>(bool, const T*, int, T*, int, ZeliSize, int, int, int, int, int, uint8_t*); \
+  template void apply<T>(bool, const T*, int, T*, int, ZeliSize, int, ZeliBorderType, const View&, uint8_t*);
+ZELCV_MORPH_INSTANTIATE(uint8_t)
+ZELCV_MORPH_INSTANTIATE(uint16_t)
+ZELCV_MORPH_INSTANTIATE(int16_t)
+ZELCV_MORPH_INSTANTIATE(float)
+#undef ZELCV_MORPH_INSTANTIATE
+
+// Bits are unpacked to one byte per pixel (0 or 1) into a ring of extended
+// rows, combined with the byte kernels (max is OR, min is AND) and packed
+// back; destination bits outside the ROI are kept.
+void applyBits(bool dilate, const uint8_t* src, int srcStep, int srcBitOffset, uint8_t* dst, int dstStep,
+               int dstBitOffset, ZeliSize roi, ZeliBorderType border, const View& v, uint8_t* work) {
+  const int W = roi.width, H = roi.height;
+  src += srcBitOffset >> 3;
+  dst += dstBitOffset >> 3;
+  const int so = srcBitOffset & 7, doff = dstBitOffset & 7;
+  const int mw = v.maskWidth, mh = v.maskHeight;
+  const int ax = v.kind == kEmpty ? 0 : v.anchorX, ay = v.kind == kEmpty ? 0 : v.anchorY;
+  const bool top = inMemoryTop(border), bottom = inMemoryBottom(border);
+  const bool left = inMemoryLeft(border), right = inMemoryRight(border);
+  const int extWidth = W + mw - 1;
+  const Slots<uint8_t> ring = makeSlots<uint8_t>(work, extWidth, 1);
+  uint8_t* acc = ring[mh];  // W bytes
+  bool anyOn = false;
+  for (int64_t i = 0; i < int64_t(mw) * mh; ++i) anyOn |= v.mask[i] != 0;
+
+  auto unpack = [&](int r, uint8_t* out) {
+    const int rr = ((r < 0 && top) || (r >= H && bottom)) ? r : clampInt(r, 0, H - 1);
+    const uint8_t* row = src + int64_t(rr) * srcStep;
+    for (int p = -ax; p < extWidth - ax; ++p) {
+      int q = p;
+      if ((p < 0 && !left) || (p >= W && !right)) q = clampInt(p, 0, W - 1);
+      out[p + ax] = uint8_t(bitAt(row, int64_t(so) + q));
+    }
+  };
+  int next = -ay;  // next extended row to unpack
+  for (int y = 0; y < H; ++y) {
+    if (!anyOn) {
+      const uint8_t* row = src + int64_t(y) * srcStep;
+      for (int x = 0; x < W; ++x) acc[x] = uint8_t(bitAt(row, int64_t(so) + x));
+    } else {
+      for (; next <= y + mh - 1 - ay; ++next) unpack(next, ring[(next + ay) % mh]);
+      bool first = true;
+      for (int j = 0; j < mh; ++j) {
+        const uint8_t* row = ring[(y + j) % mh] + ax;  // extended row y + j - ay
+        for (int i = 0; i < mw; ++i) {
+          if (!v.mask[int64_t(j) * mw + i]) continue;
+          if (first)
+            minmax::combineShifted<uint8_t, MaxOp<uint8_t>, true>(acc, W, 1, row, row, true, true, i - ax);
+          else if (dilate)
+            minmax::combineShifted<uint8_t, MaxOp<uint8_t>, false>(acc, W, 1, row, row, true, true, i - ax);
+          else
+            minmax::combineShifted<uint8_t, MinOp<uint8_t>, false>(acc, W, 1, row, row, true, true, i - ax);
+          first = false;
+        }
+      }
+    }
+    uint8_t* out = dst + int64_t(y) * dstStep;
+    for (int x = 0; x < W; ++x) {
+      const int p = doff + x;
+      const uint8_t bit = uint8_t(0x80 >> (p & 7));
+      out[p >> 3] = acc[x] ? uint8_t(out[p >> 3] | bit) : uint8_t(out[p >> 3] & ~bit);
+    }
+  }
+}
+
+}  // namespace morph
+}  // namespace zelcv
