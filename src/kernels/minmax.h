@@ -48,20 +48,55 @@ void combineRows(T* out, const T* const* rows, int count, int n) {
   }
 }
 
-// The same for a count fixed at compile time (the short vertical windows).
+// Two output rows of a vertical window that share all rows but the first
+// of the upper window and the last of the lower one:
+// out0 = op(common, first), out1 = op(common, last), common = op over the
+// N rows of `common`.
 template <int N, typename T, typename Op>
-void combineRowsFixed(T* out, const T* const* rows, int n) {
+void combinePair(T* out0, T* out1, const T* const* common, const T* first, const T* last, int n) {
   using V = simd::Vec<T>;
   int i = 0;
   for (; i + V::kLanes <= n; i += V::kLanes) {
-    auto m = V::loadu(rows[0] + i);
-    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(rows[k] + i));
-    V::storeu(out + i, m);
+    auto m = V::loadu(common[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(common[k] + i));
+    V::storeu(out0 + i, Op::v(m, V::loadu(first + i)));
+    V::storeu(out1 + i, Op::v(m, V::loadu(last + i)));
   }
   for (; i < n; ++i) {
-    T m = rows[0][i];
-    for (int k = 1; k < N; ++k) m = Op::s(m, rows[k][i]);
-    out[i] = m;
+    T m = common[0][i];
+    for (int k = 1; k < N; ++k) m = Op::s(m, common[k][i]);
+    out0[i] = Op::s(m, first[i]);
+    out1[i] = Op::s(m, last[i]);
+  }
+}
+
+template <typename T, typename Op>
+using PairKernel = void (*)(T*, T*, const T* const*, const T*, const T*, int);
+
+template <typename T, typename Op, typename Counts>
+struct PairTable;
+template <typename T, typename Op, int... N>
+struct PairTable<T, Op, std::integer_sequence<int, N...>> {
+  static constexpr PairKernel<T, Op> kernel[] = {nullptr, &combinePair<N + 1, T, Op>...};
+};
+
+// One step of the van Herk / Gil-Werman vertical pass: the running prefix of
+// the current block (prefixIn null at its first row), and the output row as
+// the maximum of the previous block's suffix and that prefix.
+template <typename T, typename Op>
+void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* suffix, int n) {
+  using V = simd::Vec<T>;
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    auto p = V::loadu(h + i);
+    if (prefixIn) p = Op::v(V::loadu(prefixIn + i), p);
+    V::storeu(prefixOut + i, p);
+    V::storeu(out + i, Op::v(V::loadu(suffix + i), p));
+  }
+  for (; i < n; ++i) {
+    T p = prefixIn ? Op::s(prefixIn[i], h[i]) : h[i];
+    prefixOut[i] = p;
+    out[i] = Op::s(suffix[i], p);
   }
 }
 
@@ -76,22 +111,32 @@ void combineForward(T* out, const T* a, const T* b, int n) {
   for (; i < n; ++i) out[i] = Op::s(a[i], b[i]);
 }
 
+// out[i] = op over src[i + offsets[k]], k < N, for i < n elements.
+template <int N, typename T, typename Op>
+void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
+  using V = simd::Vec<T>;
+  int o[N];
+  for (int k = 0; k < N; ++k) o[k] = offsets[k];
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    auto m = V::loadu(src + i + o[0]);
+    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(src + i + o[k]));
+    V::storeu(out + i, m);
+  }
+  for (; i < n; ++i) {
+    T m = src[i + o[0]];
+    for (int k = 1; k < N; ++k) m = Op::s(m, src[i + o[k]]);
+    out[i] = m;
+  }
+}
+
 // out[i] = op over src[i + k * step], k < K, for i < n elements: the kernel
 // specialised for one window width.
 template <int K, typename T, typename Op>
 void windowFixed(const T* src, T* out, int n, int step) {
-  using V = simd::Vec<T>;
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) {
-    auto m = V::loadu(src + i);
-    for (int k = 1; k < K; ++k) m = Op::v(m, V::loadu(src + i + k * step));
-    V::storeu(out + i, m);
-  }
-  for (; i < n; ++i) {
-    T m = src[i];
-    for (int k = 1; k < K; ++k) m = Op::s(m, src[i + k * step]);
-    out[i] = m;
-  }
+  int offsets[K];
+  for (int k = 0; k < K; ++k) offsets[k] = k * step;
+  windowOffsetsFixed<K, T, Op>(src, out, n, offsets);
 }
 
 template <typename T, typename Op>
@@ -104,27 +149,81 @@ struct WindowTable<T, Op, std::integer_sequence<int, K...>> {
   static constexpr WindowKernel<T, Op> kernel[] = {nullptr, &windowFixed<K + 1, T, Op>...};
 };
 
-// Generic window of K pixels over `pixels` source pixels (K <= pixels):
-// writes pixels - K + 1 window results to out[0..] by doubling: windows of
-// 2, 4, 8, ... pixels built in place in `out`, then two overlapping ones.
+// out[i] = op(a[i], b[i]) for i < n, descending, so that it may write a
+// row of window results `shift` elements further on in the row it reads, as
+// long as b - a <= shift.
 template <typename T, typename Op>
-void windowDoubling(const T* src, T* out, int pixels, int K, int channels) {
-  const int c = channels;
-  if (K == 1) {
-    memcpy(out, src, sizeof(T) * size_t(pixels) * c);
+void combineBackward(T* out, const T* a, const T* b, int n) {
+  using V = simd::Vec<T>;
+  int i = n;
+  for (; i >= V::kLanes; i -= V::kLanes)
+    V::storeu(out + i - V::kLanes, Op::v(V::loadu(a + i - V::kLanes), V::loadu(b + i - V::kLanes)));
+  for (; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
+}
+
+template <typename T, typename Op>
+using OffsetsKernel = void (*)(const T*, T*, int, const int*);
+template <typename T, typename Op, typename Counts>
+struct OffsetsTable;
+template <typename T, typename Op, int... N>
+struct OffsetsTable<T, Op, std::integer_sequence<int, N...>> {
+  static constexpr OffsetsKernel<T, Op> kernel[] = {nullptr, &windowOffsetsFixed<N + 1, T, Op>...};
+};
+
+// The same for 1 <= count <= 9.
+template <typename T, typename Op>
+void windowOffsets(const T* src, T* out, int n, const int* offsets, int count) {
+  OffsetsTable<T, Op, std::make_integer_sequence<int, 9>>::kernel[count](src, out, n, offsets);
+}
+
+// Generic window of K pixels over `pixels` source pixels (K <= pixels):
+// writes the pixels - K + 1 window results to out[shift..] (elements).
+// Windows of 4, 16, 64, ... pixels are built in `temp` (pixels - 1 pixels of
+// room, distinct from out), then at most nine of them, the last overlapping,
+// make each result. Without a temp row the windows are built in place in out
+// (doubling) and moved.
+template <typename T, typename Op>
+void windowDoubling(const T* src, T* out, int pixels, int K, int channels, int shift, T* temp) {
+  const int c = channels, n = (pixels - K + 1) * c;
+  int offsets[10];
+  if (K <= 8) {
+    for (int k = 0; k < K; ++k) offsets[k] = k * c;
+    windowOffsets<T, Op>(src, out + shift, n, offsets, K);
     return;
   }
-  combineForward<T, Op>(out, src, src + c, (pixels - 1) * c);
-  int t = 2;
-  for (; 2 * t <= K; t *= 2) combineForward<T, Op>(out, out, out + t * c, (pixels - 2 * t + 1) * c);
-  if (K > t) combineForward<T, Op>(out, out, out + (K - t) * c, (pixels - K + 1) * c);
+  if (temp) {
+    windowFixed<4, T, Op>(src, temp, (pixels - 3) * c, c);
+    int t = 4;
+    for (; K / t > 8; t *= 4) windowFixed<4, T, Op>(temp, temp, (pixels - 4 * t + 1) * c, t * c);
+    int count = 0;
+    for (int k = 0; k + t <= K; k += t) offsets[count++] = k * c;
+    if (K % t) offsets[count++] = (K - t) * c;
+    windowOffsets<T, Op>(temp, out + shift, n, offsets, count);
+    return;
+  }
+  windowFixed<4, T, Op>(src, out, (pixels - 3) * c, c);
+  int t = 4;
+  for (; 4 * t <= K; t *= 4) windowFixed<4, T, Op>(out, out, (pixels - 4 * t + 1) * c, t * c);
+  for (; 2 * t <= K; t *= 2) windowFixed<2, T, Op>(out, out, (pixels - 2 * t + 1) * c, t * c);
+  const int d = (K - t) * c;  // the second window's offset
+  if (d == 0) {
+    if (shift) memmove(out + shift, out, sizeof(T) * size_t(n));
+  } else if (shift == 0) {
+    combineForward<T, Op>(out, out, out + d, n);
+  } else if (d <= shift) {
+    combineBackward<T, Op>(out + shift, out, out + d, n);
+  } else {
+    combineForward<T, Op>(out, out, out + d, n);
+    memmove(out + shift, out, sizeof(T) * size_t(n));
+  }
 }
 
 // One row of the horizontal pass: out[x] = op over src[clamp(x + s + k)],
 // k < K, x < width, clamping to the row (the replicated border). The caller
-// has clipped s and s + K - 1 to [-(width - 1), width - 1].
+// has clipped s and s + K - 1 to [-(width - 1), width - 1]. `temp` (null or a
+// row of `width` pixels other than out) speeds up wide windows.
 template <typename T, typename Op>
-void windowRow(const T* src, T* out, int width, int channels, int s, int K) {
+void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* temp = nullptr) {
   const int c = channels;
   int xl = s < 0 ? -s : 0;
   int xr = width - K - s + 1;
@@ -135,8 +234,7 @@ void windowRow(const T* src, T* out, int width, int channels, int s, int K) {
     if (K < 16 && width >= 2 * K) {
       WindowTable<T, Op, std::make_integer_sequence<int, 15>>::kernel[K](src + (xl + s) * c, out + xl * c, n * c, c);
     } else {
-      windowDoubling<T, Op>(src + (xl + s) * c, out, n + K - 1, K, c);
-      if (xl) memmove(out + xl * c, out, sizeof(T) * size_t(n) * c);
+      windowDoubling<T, Op>(src + (xl + s) * c, out, n + K - 1, K, c, xl * c, temp);
     }
   }
   // Windows that reach past a row end: running prefix and suffix extremes.
@@ -158,6 +256,22 @@ void windowRow(const T* src, T* out, int width, int channels, int s, int K) {
       out[x * c + ch] = run;
     }
   }
+}
+
+// out[x] = op(in[clamp(x + a)], in[clamp(x + b)]), a <= 0 <= b, clamping to
+// the row: a window row built from a narrower window row of the same row.
+template <typename T, typename Op>
+void windowFromTwo(const T* in, T* out, int width, int c, int a, int b) {
+  const int x0 = -a < width ? -a : width;
+  const int x1 = width - b > x0 ? width - b : x0;
+  combineForward<T, Op>(out + x0 * c, in + (x0 + a) * c, in + (x0 + b) * c, (x1 - x0) * c);
+  auto clamp = [&](int i) { return i < 0 ? 0 : (i >= width ? width - 1 : i); };
+  auto edge = [&](int from, int to) {
+    for (int x = from; x < to; ++x)
+      for (int ch = 0; ch < c; ++ch) out[x * c + ch] = Op::s(in[clamp(x + a) * c + ch], in[clamp(x + b) * c + ch]);
+  };
+  edge(0, x0);
+  edge(x1, width);
 }
 
 // acc[x] = op(acc[x], row(x + shift)) for x < width (or plain assignment when

@@ -44,6 +44,10 @@ bool overlaps(const void* src, int srcStep, const void* dst, int dstStep, int he
   return s < dEnd && d < sEnd;
 }
 
+// Vertical windows up to this height combine rows directly; taller ones use
+// the van Herk scheme.
+constexpr int kDirectHeights = 9;
+
 // Row slots in the work memory, each a 32-aligned row of the ROI.
 template <typename T>
 struct Slots {
@@ -57,8 +61,8 @@ Slots<T> makeSlots(uint8_t* work, int width, int channels) {
 }
 
 // The rectangle: horizontal window maxima per source row into row slots,
-// then the vertical window over those rows: a direct ring for heights 1, 3
-// and 5, otherwise the van Herk / Gil-Werman scheme (blocks of Kv rows with
+// then the vertical window over those rows: a direct ring of Kv + 1 rows for
+// short windows, otherwise the van Herk / Gil-Werman scheme (blocks of Kv rows with
 // suffix maxima inside the block and prefix maxima of the next one), whose
 // cost per pixel does not depend on the height.
 template <typename T, typename Op>
@@ -75,7 +79,9 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
   const bool up = sv + Kv - 1 < 0;
   auto extRow = [&](int k) { return rowAt(src, srcStep, clampInt(up ? H + sv + Kv - 2 - k : sv + k, 0, H - 1)); };
   auto outRow = [&](int m) { return rowAt(dst, dstStep, up ? H - 1 - m : m); };
-  auto hpass = [&](int k, T* out) { minmax::windowRow<T, Op>(extRow(k), out, W, c, s, K); };
+  // Not in place, the last output row is free scratch until it is written.
+  T* temp = inPlace ? nullptr : outRow(H - 1);
+  auto hpass = [&](int k, T* out) { minmax::windowRow<T, Op>(extRow(k), out, W, c, s, K, out == temp ? nullptr : temp); };
   const int steps = H + Kv - 1;
 
   if (Kv == 1) {
@@ -89,16 +95,25 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
     }
     return;
   }
-  if ((Kv == 3 || Kv == 5) && 2 * Kv <= H) {
-    const T* rows[5];
-    for (int k = 0; k < steps; ++k) {
-      hpass(k, slot[k % Kv]);
-      if (k < Kv - 1) continue;
-      for (int i = 0; i < Kv; ++i) rows[i] = slot[i];
-      if (Kv == 3)
-        minmax::combineRowsFixed<3, T, Op>(outRow(k - Kv + 1), rows, n);
-      else
-        minmax::combineRowsFixed<5, T, Op>(outRow(k - Kv + 1), rows, n);
+  if (Kv <= kDirectHeights && 2 * Kv <= H) {
+    // Kv + 1 rows: two output rows at a time share Kv - 1 of them.
+    const int ring = Kv + 1;
+    const T* common[kDirectHeights];
+    int next = 0;
+    auto ensure = [&](int upTo) {
+      for (; next <= upTo; ++next) hpass(next, slot[next % ring]);
+    };
+    for (int m = 0; m < H; m += 2) {
+      if (m + 1 < H) {
+        ensure(m + Kv);
+        for (int i = 0; i < Kv - 1; ++i) common[i] = slot[(m + 1 + i) % ring];
+        minmax::PairTable<T, Op, std::make_integer_sequence<int, kDirectHeights>>::kernel[Kv - 1](
+            outRow(m), outRow(m + 1), common, slot[m % ring], slot[(m + Kv) % ring], n);
+      } else {
+        ensure(m + Kv - 1);
+        for (int i = 0; i < Kv; ++i) common[i] = slot[(m + i) % ring];
+        minmax::combineRows<T, Op>(outRow(m), common, Kv, n);
+      }
     }
     return;
   }
@@ -113,12 +128,8 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
     } else if (b > 0) {
       // The prefix of this block so far takes the slot of the previous
       // block's suffix row q, used by the step before (row 0 at the block end).
-      T* prefix = slot[sg + q];
-      if (q == 0)
-        memcpy(prefix, h, sizeof(T) * size_t(n));
-      else
-        minmax::combineForward<T, Op>(prefix, slot[sg + q - 1], h, n);
-      minmax::combineForward<T, Op>(outRow(k - Kv + 1), slot[sg + q + 1], prefix, n);
+      minmax::vanHerkStep<T, Op>(outRow(k - Kv + 1), slot[sg + q], q ? slot[sg + q - 1] : nullptr, h,
+                                 slot[sg + q + 1], n);
     }
   }
 }
@@ -137,14 +148,46 @@ void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
   const Slots<T> slot = makeSlots<T>(work + 16 + sizeof(void*) * size_t(rowCount), W, c);
   auto srcRow = [&](int r) { return rowAt(src, srcStep, clampInt(r, 0, H - 1)); };
   // A single-pixel run at the anchor is the source row itself.
+  T* temp = inPlace ? nullptr : rowAt(dst, dstStep, H - 1);  // scratch until written last
   auto aliased = [&](int j) { return !inPlace && v.runs[j].start == 0 && v.runs[j].end == 0; };
+  // A run at most twice as long as a shorter run inside it is the maximum of
+  // that run's row read at two offsets: plan the runs shortest first.
+  struct Plan {
+    int run, s, K, parent;
+  };
+  constexpr int kPlanned = 32;
+  Plan plan[kPlanned];
+  const bool planned = runCount <= kPlanned;
+  if (planned) {
+    for (int j = 0; j < runCount; ++j) {
+      plan[j] = {j, v.runs[j].start, v.runs[j].end - v.runs[j].start + 1, -1};
+      clipWindow(plan[j].s, plan[j].K, W);
+    }
+    std::sort(plan, plan + runCount, [](const Plan& a, const Plan& b) { return a.K < b.K; });
+    for (int j = 1; j < runCount; ++j)
+      for (int p = j - 1; p >= 0 && plan[j].parent < 0; --p)
+        if (plan[p].s >= plan[j].s && plan[p].s + plan[p].K <= plan[j].s + plan[j].K && 2 * plan[p].K >= plan[j].K)
+          plan[j].parent = p;
+  }
   for (int r = dyMin; r <= H - 1 + dyMax; ++r) {
     const int g = (r - dyMin) % span;
-    for (int j = 0; j < runCount; ++j) {
-      if (aliased(j)) continue;
-      int s = v.runs[j].start, K = v.runs[j].end - v.runs[j].start + 1;
-      clipWindow(s, K, W);
-      minmax::windowRow<T, Op>(srcRow(r), slot[g * runCount + j], W, c, s, K);
+    auto runRow = [&](int j) -> const T* { return aliased(j) ? srcRow(r) : slot[g * runCount + j]; };
+    for (int i = 0; i < runCount; ++i) {
+      if (!planned) {
+        int s = v.runs[i].start, K = v.runs[i].end - v.runs[i].start + 1;
+        clipWindow(s, K, W);
+        if (!aliased(i)) minmax::windowRow<T, Op>(srcRow(r), slot[g * runCount + i], W, c, s, K, temp);
+        continue;
+      }
+      const Plan& q = plan[i];
+      if (aliased(q.run)) continue;
+      T* out = slot[g * runCount + q.run];
+      if (q.parent < 0) {
+        minmax::windowRow<T, Op>(srcRow(r), out, W, c, q.s, q.K, temp);
+      } else {
+        const Plan& p = plan[q.parent];
+        minmax::windowFromTwo<T, Op>(runRow(p.run), out, W, c, q.s - p.s, q.s + q.K - p.s - p.K);
+      }
     }
     const int y = r - dyMax;
     if (y < 0) continue;
