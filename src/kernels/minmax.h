@@ -31,20 +31,47 @@ struct MinOp {
   static typename V::Raw v(typename V::Raw a, typename V::Raw b) { return V::min(a, b); }
 };
 
-// out[i] = op over rows[k][i], k < count (count >= 1), i < n.
-template <typename T, typename Op>
-void combineRows(T* out, const T* const* rows, int count, int n) {
+// out[i] = op over rows[k][i], k < N, i < n.
+template <int N, typename T, typename Op>
+void combineRowsFixed(T* out, const T* const* rows, int n) {
   using V = simd::Vec<T>;
+  const T* r[N];
+  for (int k = 0; k < N; ++k) r[k] = rows[k];
   int i = 0;
   for (; i + V::kLanes <= n; i += V::kLanes) {
-    auto m = V::loadu(rows[0] + i);
-    for (int k = 1; k < count; ++k) m = Op::v(m, V::loadu(rows[k] + i));
+    auto m = V::loadu(r[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(r[k] + i));
     V::storeu(out + i, m);
   }
   for (; i < n; ++i) {
-    T m = rows[0][i];
-    for (int k = 1; k < count; ++k) m = Op::s(m, rows[k][i]);
+    T m = r[0][i];
+    for (int k = 1; k < N; ++k) m = Op::s(m, r[k][i]);
     out[i] = m;
+  }
+}
+
+template <typename T, typename Op>
+using CombineKernel = void (*)(T*, const T* const*, int);
+template <typename T, typename Op, typename Counts>
+struct CombineTable;
+template <typename T, typename Op, int... N>
+struct CombineTable<T, Op, std::integer_sequence<int, N...>> {
+  static constexpr CombineKernel<T, Op> kernel[] = {nullptr, &combineRowsFixed<N + 1, T, Op>...};
+};
+
+// out[i] = op over rows[k][i], k < count (count >= 1), i < n: up to eight
+// rows at a time.
+template <typename T, typename Op>
+void combineRows(T* out, const T* const* rows, int count, int n) {
+  constexpr int kMost = 8;
+  using Table = CombineTable<T, Op, std::make_integer_sequence<int, kMost>>;
+  Table::kernel[count < kMost ? count : kMost](out, rows, n);
+  const T* pair[kMost];
+  for (int k = kMost; k < count; k += kMost - 1) {
+    const int take = count - k < kMost - 1 ? count - k : kMost - 1;
+    pair[0] = out;
+    for (int j = 0; j < take; ++j) pair[j + 1] = rows[k + j];
+    Table::kernel[take + 1](out, pair, n);
   }
 }
 
@@ -186,7 +213,7 @@ template <typename T, typename Op>
 void windowDoubling(const T* src, T* out, int pixels, int K, int channels, int shift, T* temp) {
   const int c = channels, n = (pixels - K + 1) * c;
   int offsets[10];
-  if (K <= 8) {
+  if (K <= 8 && !(temp && K >= 6)) {
     for (int k = 0; k < K; ++k) offsets[k] = k * c;
     windowOffsets<T, Op>(src, out + shift, n, offsets, K);
     return;
@@ -231,7 +258,7 @@ void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* t
   if (xr < xl) xr = xl;
   if (xr > xl) {
     const int n = xr - xl;
-    if (K < 16 && width >= 2 * K) {
+    if (K < 16 && width >= 2 * K && !(temp && K >= 6)) {
       WindowTable<T, Op, std::make_integer_sequence<int, 15>>::kernel[K](src + (xl + s) * c, out + xl * c, n * c, c);
     } else {
       windowDoubling<T, Op>(src + (xl + s) * c, out, n + K - 1, K, c, xl * c, temp);
