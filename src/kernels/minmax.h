@@ -1,8 +1,8 @@
 // Row kernels for running maxima and minima, shared by the morphology
 // families: element-wise combination of rows, horizontal window maxima (one
-// kernel per width 1..15 plus a generic doubling kernel whose cost grows with
-// the logarithm of the width), and shifted combination with replicated or
-// in-memory row ends. Elements of a multi-channel row are independent; a
+// kernel per width 1..15, and a generic kernel that builds 4-, 16-, 64-...
+// pixel windows, so that its cost grows with the logarithm of the width),
+// and shifted combination with replicated or in-memory row ends. Elements of a multi-channel row are independent; a
 // window step is one pixel, that is `channels` elements.
 #ifndef ZELCV_KERNELS_MINMAX_H
 #define ZELCV_KERNELS_MINMAX_H
@@ -31,6 +31,18 @@ struct MinOp {
   static typename V::Raw v(typename V::Raw a, typename V::Raw b) { return V::min(a, b); }
 };
 
+// A kernel template instantiated for counts 1..N, indexed by the count;
+// `Which::get<N, T, Op>()` names the instance.
+template <typename Which, typename T, typename Op, typename Counts>
+struct CountTable;
+template <typename Which, typename T, typename Op, int... N>
+struct CountTable<Which, T, Op, std::integer_sequence<int, N...>> {
+  using Kernel = decltype(Which::template get<1, T, Op>());
+  static constexpr Kernel kernel[] = {nullptr, Which::template get<N + 1, T, Op>()...};
+};
+template <typename Which, typename T, typename Op, int Most>
+using CountTableTo = CountTable<Which, T, Op, std::make_integer_sequence<int, Most>>;
+
 // out[i] = op over rows[k][i], k < N, i < n.
 template <int N, typename T, typename Op>
 void combineRowsFixed(T* out, const T* const* rows, int n) {
@@ -50,13 +62,9 @@ void combineRowsFixed(T* out, const T* const* rows, int n) {
   }
 }
 
-template <typename T, typename Op>
-using CombineKernel = void (*)(T*, const T* const*, int);
-template <typename T, typename Op, typename Counts>
-struct CombineTable;
-template <typename T, typename Op, int... N>
-struct CombineTable<T, Op, std::integer_sequence<int, N...>> {
-  static constexpr CombineKernel<T, Op> kernel[] = {nullptr, &combineRowsFixed<N + 1, T, Op>...};
+struct CombineRows {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &combineRowsFixed<N, T, Op>; }
 };
 
 // out[i] = op over rows[k][i], k < count (count >= 1), i < n: up to eight
@@ -64,7 +72,7 @@ struct CombineTable<T, Op, std::integer_sequence<int, N...>> {
 template <typename T, typename Op>
 void combineRows(T* out, const T* const* rows, int count, int n) {
   constexpr int kMost = 8;
-  using Table = CombineTable<T, Op, std::make_integer_sequence<int, kMost>>;
+  using Table = CountTableTo<CombineRows, T, Op, kMost>;
   Table::kernel[count < kMost ? count : kMost](out, rows, n);
   const T* pair[kMost];
   for (int k = kMost; k < count; k += kMost - 1) {
@@ -97,14 +105,9 @@ void combinePair(T* out0, T* out1, const T* const* common, const T* first, const
   }
 }
 
-template <typename T, typename Op>
-using PairKernel = void (*)(T*, T*, const T* const*, const T*, const T*, int);
-
-template <typename T, typename Op, typename Counts>
-struct PairTable;
-template <typename T, typename Op, int... N>
-struct PairTable<T, Op, std::integer_sequence<int, N...>> {
-  static constexpr PairKernel<T, Op> kernel[] = {nullptr, &combinePair<N + 1, T, Op>...};
+struct CombinePair {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &combinePair<N, T, Op>; }
 };
 
 // One step of the van Herk / Gil-Werman vertical pass: the running prefix of
@@ -166,15 +169,6 @@ void windowFixed(const T* src, T* out, int n, int step) {
   windowOffsetsFixed<K, T, Op>(src, out, n, offsets);
 }
 
-template <typename T, typename Op>
-using WindowKernel = void (*)(const T*, T*, int, int);
-
-template <typename T, typename Op, typename Widths>
-struct WindowTable;
-template <typename T, typename Op, int... K>
-struct WindowTable<T, Op, std::integer_sequence<int, K...>> {
-  static constexpr WindowKernel<T, Op> kernel[] = {nullptr, &windowFixed<K + 1, T, Op>...};
-};
 
 // out[i] = op(a[i], b[i]) for i < n, descending, so that it may write a
 // row of window results `shift` elements further on in the row it reads, as
@@ -188,19 +182,15 @@ void combineBackward(T* out, const T* a, const T* b, int n) {
   for (; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
 }
 
-template <typename T, typename Op>
-using OffsetsKernel = void (*)(const T*, T*, int, const int*);
-template <typename T, typename Op, typename Counts>
-struct OffsetsTable;
-template <typename T, typename Op, int... N>
-struct OffsetsTable<T, Op, std::integer_sequence<int, N...>> {
-  static constexpr OffsetsKernel<T, Op> kernel[] = {nullptr, &windowOffsetsFixed<N + 1, T, Op>...};
+struct WindowOffsets {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &windowOffsetsFixed<N, T, Op>; }
 };
 
-// The same for 1 <= count <= 9.
+// The same for 1 <= count <= 15 (one kernel per count).
 template <typename T, typename Op>
 void windowOffsets(const T* src, T* out, int n, const int* offsets, int count) {
-  OffsetsTable<T, Op, std::make_integer_sequence<int, 9>>::kernel[count](src, out, n, offsets);
+  CountTableTo<WindowOffsets, T, Op, 15>::kernel[count](src, out, n, offsets);
 }
 
 // Generic window of K pixels over `pixels` source pixels (K <= pixels):
@@ -246,6 +236,9 @@ void windowDoubling(const T* src, T* out, int pixels, int K, int channels, int s
 }
 
 // One row of the horizontal pass: out[x] = op over src[clamp(x + s + k)],
+// with one kernel per width 1..15 on rows at least twice the width (widths of
+// six or more go through four-pixel windows when a scratch row is given) and
+// the generic kernel otherwise;
 // k < K, x < width, clamping to the row (the replicated border). The caller
 // has clipped s and s + K - 1 to [-(width - 1), width - 1]. `temp` (null or a
 // row of `width` pixels other than out) speeds up wide windows.
@@ -259,7 +252,9 @@ void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* t
   if (xr > xl) {
     const int n = xr - xl;
     if (K < 16 && width >= 2 * K && !(temp && K >= 6)) {
-      WindowTable<T, Op, std::make_integer_sequence<int, 15>>::kernel[K](src + (xl + s) * c, out + xl * c, n * c, c);
+      int offsets[15];
+      for (int k = 0; k < K; ++k) offsets[k] = k * c;
+      windowOffsets<T, Op>(src + (xl + s) * c, out + xl * c, n * c, offsets, K);
     } else {
       windowDoubling<T, Op>(src + (xl + s) * c, out, n + K - 1, K, c, xl * c, temp);
     }

@@ -107,7 +107,7 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
       if (m + 1 < H) {
         ensure(m + Kv);
         for (int i = 0; i < Kv - 1; ++i) common[i] = slot[(m + 1 + i) % ring];
-        minmax::PairTable<T, Op, std::make_integer_sequence<int, kDirectHeights>>::kernel[Kv - 1](
+        minmax::CountTableTo<minmax::CombinePair, T, Op, kDirectHeights>::kernel[Kv - 1](
             outRow(m), outRow(m + 1), common, slot[m % ring], slot[(m + Kv) % ring], n);
       } else {
         ensure(m + Kv - 1);

@@ -121,16 +121,7 @@ ZelStatus morphBits(bool dilate, const Zel8u* src, int srcStep, int srcBitOffset
 
 BuildRequest request(int mode, int flavor, int dataType, int channels, int roiWidth, const Zel8u* mask,
                      ZeliSize maskSize, ZeliPoint anchor) {
-  BuildRequest q = {};
-  q.mode = mode;
-  q.flavor = flavor;
-  q.dataType = dataType;
-  q.channels = channels;
-  q.roiWidth = roiWidth;
-  q.mask = mask;
-  q.maskSize = maskSize;
-  q.anchor = anchor;
-  return q;
+  return {mode, flavor, dataType, channels, roiWidth, mask, maskSize, anchor, nullptr, nullptr, nullptr};
 }
 
 ZelStatus morphologyGetSize(int dataType, int channels, int roiWidth, const Zel8u* mask, ZeliSize maskSize,

@@ -253,20 +253,13 @@ ZelStatus buildState(const BuildRequest& q) {
 View readState(const void* state) {
   Header h;
   memcpy(&h, state, sizeof h);
-  View v = {};
-  v.kind = h.kind;
-  v.maskWidth = h.maskWidth;
-  v.maskHeight = h.maskHeight;
-  v.anchorX = h.anchorX;
-  v.anchorY = h.anchorY;
-  v.maxRoiWidth = h.maxRoiWidth;
-  v.dataType = h.dataType;
-  v.channels = h.channels;
+  View v = {h.kind, h.maskWidth, h.maskHeight, h.anchorX, h.anchorY, h.maxRoiWidth, h.dataType, h.channels,
+            {}, nullptr, nullptr, static_cast<const uint8_t*>(h.kernelParam), nullptr};
   const uint8_t* payload = static_cast<const uint8_t*>(h.shape);
   memcpy(&v.shape, payload, sizeof v.shape);
   v.rows = reinterpret_cast<const RowEntry*>(payload + sizeof(Shape));
   v.runs = reinterpret_cast<const Run*>(v.rows + v.shape.rowCount);
-  v.mask = static_cast<const uint8_t*>(h.kernelParam);
+  // Older states keep their work area right after the mask copy.
   v.work = const_cast<uint8_t*>(v.mask) + int64_t(h.maskWidth) * h.maskHeight;
   return v;
 }
@@ -274,17 +267,8 @@ View readState(const void* state) {
 View readBitState(const void* state) {
   BitHeader b;
   memcpy(&b, state, sizeof b);
-  View v = {};
-  v.kind = b.kind;
-  v.maskWidth = b.maskWidth;
-  v.maskHeight = b.maskHeight;
-  v.anchorX = b.anchorX;
-  v.anchorY = b.anchorY;
-  v.maxRoiWidth = b.maxRoiWidth;
-  v.dataType = zel8u;
-  v.channels = 1;
-  v.mask = static_cast<const uint8_t*>(state) + sizeof b;
-  return v;
+  return {b.kind, b.maskWidth, b.maskHeight, b.anchorX, b.anchorY, b.maxRoiWidth, zel8u, 1, {}, nullptr, nullptr,
+          static_cast<const uint8_t*>(state) + sizeof b, nullptr};
 }
 
 }  // namespace morph
