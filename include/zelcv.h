@@ -165,7 +165,8 @@ ZELCV_API ZelStatus zeliPyramidLayerUpFree_32f_C3R(ZeliPyramidLayerState* state)
  * plus a separate work buffer per call; DilateBorder/ErodeBorder accept
  * zelBorderReplicate with any in-memory side flags, or zelBorderInMemory;
  * borderValue is never read. BorderInit does not use its buffer argument (it
- * may be null). 16u, 16s and 1u refuse src == dst (-9997).
+ * may be null). 8u and 32f accept src == dst (the same image and step);
+ * other overlaps are not supported. 16u, 16s and 1u refuse src == dst (-9997).
  * States are placed at the start of the caller's block at any alignment;
  * copying a built state elsewhere is not supported. Sizes that do not fit in
  * 32 bits give zelStatusBadSize.
