@@ -110,6 +110,53 @@ struct CombinePair {
   static constexpr auto get() { return &combinePair<N, T, Op>; }
 };
 
+// Four output rows of a vertical window of N + 3 rows (N >= 0), from the
+// N rows all four share, the three rows before them and the three after:
+// out[0] = op(common, a0, a1, a2), out[1] = op(common, a1, a2, b0),
+// out[2] = op(common, a2, b0, b1), out[3] = op(common, b0, b1, b2).
+template <int N, typename T, typename Op>
+void combineQuad(T* const* out, const T* const* common, const T* const* a, const T* const* b, int n) {
+  using V = simd::Vec<T>;
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    const auto a2 = V::loadu(a[2] + i), a1 = Op::v(V::loadu(a[1] + i), a2), a0 = Op::v(V::loadu(a[0] + i), a1);
+    const auto b0 = V::loadu(b[0] + i), b1 = Op::v(b0, V::loadu(b[1] + i)), b2 = Op::v(b1, V::loadu(b[2] + i));
+    if constexpr (N == 0) {
+      V::storeu(out[0] + i, a0);
+      V::storeu(out[1] + i, Op::v(a1, b0));
+      V::storeu(out[2] + i, Op::v(a2, b1));
+      V::storeu(out[3] + i, b2);
+    } else {
+      auto m = V::loadu(common[0] + i);
+      for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(common[k] + i));
+      V::storeu(out[0] + i, Op::v(m, a0));
+      V::storeu(out[1] + i, Op::v(m, Op::v(a1, b0)));
+      V::storeu(out[2] + i, Op::v(m, Op::v(a2, b1)));
+      V::storeu(out[3] + i, Op::v(m, b2));
+    }
+  }
+  for (; i < n; ++i) {
+    const T a2 = a[2][i], a1 = Op::s(a[1][i], a2), a0 = Op::s(a[0][i], a1);
+    const T b0 = b[0][i], b1 = Op::s(b0, b[1][i]), b2 = Op::s(b1, b[2][i]);
+    T m0 = a0, m1 = Op::s(a1, b0), m2 = Op::s(a2, b1), m3 = b2;
+    for (int k = 0; k < N; ++k) {
+      m0 = Op::s(common[k][i], m0);
+      m1 = Op::s(common[k][i], m1);
+      m2 = Op::s(common[k][i], m2);
+      m3 = Op::s(common[k][i], m3);
+    }
+    out[0][i] = m0;
+    out[1][i] = m1;
+    out[2][i] = m2;
+    out[3][i] = m3;
+  }
+}
+
+struct CombineQuad {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &combineQuad<N - 1, T, Op>; }
+};
+
 // One step of the van Herk / Gil-Werman vertical pass: the running prefix of
 // the current block (prefixIn null at its first row), and the output row as
 // the maximum of the previous block's suffix and that prefix.

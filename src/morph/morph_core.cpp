@@ -96,23 +96,34 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
     return;
   }
   if (Kv <= kDirectHeights && 2 * Kv <= H) {
-    // Kv + 1 rows: two output rows at a time share Kv - 1 of them.
-    const int ring = Kv + 1;
+    // Four output rows at a time share Kv - 3 rows (heights 4 and more), two
+    // share Kv - 1: a ring of Kv + 3 rows (Kv + 1 below height 4).
+    const int ring = Kv >= 4 ? Kv + 3 : Kv + 1;
     const T* common[kDirectHeights];
     int next = 0;
     auto ensure = [&](int upTo) {
       for (; next <= upTo; ++next) hpass(next, slot[next % ring]);
     };
-    for (int m = 0; m < H; m += 2) {
-      if (m + 1 < H) {
+    for (int m = 0; m < H;) {
+      if (Kv >= 4 && m + 3 < H) {
+        ensure(m + Kv + 2);
+        T* out[4] = {outRow(m), outRow(m + 1), outRow(m + 2), outRow(m + 3)};
+        const T* a[3] = {slot[m % ring], slot[(m + 1) % ring], slot[(m + 2) % ring]};
+        const T* b[3] = {slot[(m + Kv) % ring], slot[(m + Kv + 1) % ring], slot[(m + Kv + 2) % ring]};
+        for (int i = 0; i < Kv - 3; ++i) common[i] = slot[(m + 3 + i) % ring];
+        minmax::CountTableTo<minmax::CombineQuad, T, Op, kDirectHeights>::kernel[Kv - 2](out, common, a, b, n);
+        m += 4;
+      } else if (m + 1 < H) {
         ensure(m + Kv);
         for (int i = 0; i < Kv - 1; ++i) common[i] = slot[(m + 1 + i) % ring];
         minmax::CountTableTo<minmax::CombinePair, T, Op, kDirectHeights>::kernel[Kv - 1](
             outRow(m), outRow(m + 1), common, slot[m % ring], slot[(m + Kv) % ring], n);
+        m += 2;
       } else {
         ensure(m + Kv - 1);
         for (int i = 0; i < Kv; ++i) common[i] = slot[(m + i) % ring];
         minmax::combineRows<T, Op>(outRow(m), common, Kv, n);
+        m += 1;
       }
     }
     return;
