@@ -266,4 +266,88 @@ TEST(CannyBorder, AllocatesNothing) {
   EXPECT_EQ(faults.allocations(), 0);
 }
 
+// ---- Edge-case fields ----------------------------------------------------------
+
+// Edges of a 16-bit derivative field, checked against the reference as well.
+std::vector<Zel8u> edges16s(const std::vector<Zel16s>& dx, const std::vector<Zel16s>& dy, int width, int height,
+                            float low, float high) {
+  std::mt19937 rng(width * 131 + height);
+  checkDerivativeCanny(dx, dy, width, height, low, high, rng);
+  std::vector<Zel32f> fx(dx.begin(), dx.end()), fy(dy.begin(), dy.end());
+  checkDerivativeCanny(fx, fy, width, height, low, high, rng);
+  return zeltest::referenceCanny(dx, dy, width, height, low, high, {true, false});
+}
+
+std::vector<Zel8u> only(int width, int height, std::initializer_list<std::pair<int, int>> points) {
+  std::vector<Zel8u> e(size_t(width) * height, 0);
+  for (auto [x, y] : points) e[size_t(y) * width + x] = 255;
+  return e;
+}
+
+TEST(CannyFields, ConstantFieldsEdgeOnlyWhereTheComparedNeighbourIsOutside) {
+  const int w = 7, h = 5;
+  const size_t n = size_t(w) * h;
+  std::vector<Zel16s> c(n, 50), z(n, 0), minus(n, -50);
+  std::vector<std::pair<int, int>> column, row;
+  for (int y = 0; y < h; ++y) column.emplace_back(0, y);
+  for (int x = 0; x < w; ++x) row.emplace_back(x, 0);
+  std::vector<Zel8u> firstColumn(n, 0), firstRow(n, 0);
+  for (auto [x, y] : column) firstColumn[size_t(y) * w + x] = 255;
+  for (auto [x, y] : row) firstRow[size_t(y) * w + x] = 255;
+  EXPECT_EQ(edges16s(c, z, w, h, 10, 40), firstColumn);
+  EXPECT_EQ(edges16s(c, z, w, h, 10, 50), std::vector<Zel8u>(n, 0));  // m == high does not seed
+  EXPECT_EQ(edges16s(z, c, w, h, 10, 40), firstRow);
+  // Diagonals: only the two corners whose compared neighbours both lie outside.
+  EXPECT_EQ(edges16s(c, c, w, h, 10, 40), only(w, h, {{w - 1, 0}, {0, h - 1}}));
+  EXPECT_EQ(edges16s(c, minus, w, h, 10, 40), only(w, h, {{0, 0}, {w - 1, h - 1}}));
+  EXPECT_EQ(edges16s({50}, {50}, 1, 1, 10, 40), only(1, 1, {{0, 0}}));
+  // Zero magnitudes never become edges, even with zero thresholds.
+  EXPECT_EQ(edges16s(z, z, w, h, 0, 0), std::vector<Zel8u>(n, 0));
+}
+
+TEST(CannyFields, RidgesPlateausEqualThresholdsAndDiagonalChains) {
+  const int w = 9, h = 6;
+  const size_t n = size_t(w) * h;
+  std::vector<Zel16s> dx(n, 0), z(n, 0);
+  for (int y = 0; y < h; ++y) dx[size_t(y) * w + 3] = 100;
+  std::vector<Zel8u> ridge(n, 0);
+  for (int y = 0; y < h; ++y) ridge[size_t(y) * w + 3] = 255;
+  EXPECT_EQ(edges16s(dx, z, w, h, 20, 60), ridge);
+  // Equal thresholds: candidates at m == high join only through a seed.
+  EXPECT_EQ(edges16s(dx, z, w, h, 100, 100), std::vector<Zel8u>(n, 0));
+  dx[size_t(2) * w + 3] = 120;
+  EXPECT_EQ(edges16s(dx, z, w, h, 100, 100), ridge);
+  // A plateau two pixels wide across the edge keeps its left pixel.
+  for (int y = 0; y < h; ++y) dx[size_t(y) * w + 3] = dx[size_t(y) * w + 4] = 100;
+  EXPECT_EQ(edges16s(dx, z, w, h, 20, 60), ridge);
+  std::vector<Zel8u> topRow(n, 0);
+  for (int x = 0; x < w; ++x) topRow[size_t(2) * w + x] = 255;
+  std::vector<Zel16s> dy(n, 0);
+  for (int x = 0; x < w; ++x) dy[size_t(2) * w + x] = dy[size_t(3) * w + x] = 100;
+  EXPECT_EQ(edges16s(z, dy, w, h, 20, 60), topRow);
+  // Weak maxima touching only diagonally are connected to the seed.
+  std::vector<Zel16s> chain(n, 0);
+  for (int i = 0; i < 5; ++i) chain[size_t(i) * w + i + 1] = i == 0 ? 120 : 70;
+  EXPECT_EQ(edges16s(chain, z, w, h, 50, 100), only(w, h, {{1, 0}, {2, 1}, {3, 2}, {4, 3}, {5, 4}}));
+  chain[size_t(2) * w + 3] = 0;  // a gap stops the growth
+  EXPECT_EQ(edges16s(chain, z, w, h, 50, 100), only(w, h, {{1, 0}, {2, 1}}));
+}
+
+// ---- Sizes that need 32-bit stack coordinates ----------------------------------
+
+TEST(CannySizes, SidesOf65533AndAboveMatchTheReference) {
+  std::mt19937 rng(9);
+  for (ZeliSize roi : {ZeliSize{1, 70000}, ZeliSize{65533, 2}}) {
+    SCOPED_TRACE(testing::Message() << roi.width << "x" << roi.height);
+    std::vector<Zel16s> dx, dy;
+    derivativeField(7, roi.width, roi.height, rng, dx, dy);
+    checkDerivativeCanny(dx, dy, roi.width, roi.height, 20.0f, 90.0f, rng);
+    checkBorderCanny({zelFilterSobel, zelMaskSize3x3, zelNormL1, zelBorderReplicate}, 7, roi.width, roi.height,
+                     rng);
+  }
+  std::vector<Zel32f> fx, fy;
+  derivativeField(9, 2, 66000, rng, fx, fy);
+  checkDerivativeCanny(fx, fy, 2, 66000, 1000.0f, 20000.0f, rng);
+}
+
 }  // namespace
