@@ -97,7 +97,7 @@ ZelStatus cannyFromDerivatives(const T* srcDx, int srcDxStep, const T* srcDy, in
   auto produce = [&](int y, float* mag, uint8_t* codes) {
     const T* dx = reinterpret_cast<const T*>(reinterpret_cast<const uint8_t*>(srcDx) + ptrdiff_t(y) * srcDxStep);
     const T* dy = reinterpret_cast<const T*>(reinterpret_cast<const uint8_t*>(srcDy) + ptrdiff_t(y) * srcDyStep);
-    canny::magnitudeRow<LowRule::kKeepEqual, Norm::kL1>(dx, dy, roi.width, low, mag, codes);
+    canny::magnitudeRow<LowRule::kKeepEqual, Norm::kL1>(dx, dy, roi.width, low, 0, mag, codes);
   };
   if (smallImage(roi))
     detect<canny::Pair16>(ws, roi, high, dst, dstStep, produce);
@@ -117,9 +117,10 @@ void cannyFromImage(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, Zeli
   const DerivativeRows rows(src, srcStep, roi, kernel, border, borderValue, scratch);
   Workspace rest = ws;
   rest.next = scratch + DerivativeRows::scratchBytes(kernel, roi.width);
+  const int32_t squaredLimit = N == Norm::kL2 ? canny::squaredLowLimit<LowRule::kStrict>(low) : 0;
   auto produce = [&](int y, float* mag, uint8_t* codes) {
     rows.row(y, dx, dy);
-    canny::magnitudeRow<LowRule::kStrict, N>(dx, dy, roi.width, low, mag, codes);
+    canny::magnitudeRow<LowRule::kStrict, N>(dx, dy, roi.width, low, squaredLimit, mag, codes);
   };
   // The size formula has room for four bytes a stack entry only.
   if (smallImage(roi))

@@ -8,6 +8,7 @@
 #include <emmintrin.h>
 
 #include <cmath>
+#include <cstddef>
 #include <cstdint>
 #include <cstring>
 
@@ -90,8 +91,10 @@ inline __m128i absInt32(__m128i v) {
   return _mm_sub_epi32(_mm_xor_si128(v, s), s);
 }
 
+// dx, dy as 32-bit lanes; for L2, squares holds dx * dx + dy * dy (exact in
+// 32 bits while neither derivative is -32768).
 template <Norm N>
-inline MagnitudeLanes lanesFromInt32(__m128i dx, __m128i dy) {
+inline MagnitudeLanes lanesFromInt32(__m128i dx, __m128i dy, __m128i squares) {
   MagnitudeLanes l;
   __m128i ix = absInt32(dx), iy = absInt32(dy);
   l.ax = _mm_cvtepi32_ps(ix);
@@ -100,15 +103,26 @@ inline MagnitudeLanes lanesFromInt32(__m128i dx, __m128i dy) {
   if (N == Norm::kL1) {
     l.m = _mm_cvtepi32_ps(_mm_add_epi32(ix, iy));
   } else {
-    // Squares and their sum are exact in double precision.
-    __m128d x0 = _mm_cvtepi32_pd(dx), y0 = _mm_cvtepi32_pd(dy);
-    __m128d x1 = _mm_cvtepi32_pd(_mm_shuffle_epi32(dx, 0xEE));
-    __m128d y1 = _mm_cvtepi32_pd(_mm_shuffle_epi32(dy, 0xEE));
-    __m128d s0 = _mm_sqrt_pd(_mm_add_pd(_mm_mul_pd(x0, x0), _mm_mul_pd(y0, y0)));
-    __m128d s1 = _mm_sqrt_pd(_mm_add_pd(_mm_mul_pd(x1, x1), _mm_mul_pd(y1, y1)));
+    __m128d s0 = _mm_sqrt_pd(_mm_cvtepi32_pd(squares));
+    __m128d s1 = _mm_sqrt_pd(_mm_cvtepi32_pd(_mm_shuffle_epi32(squares, 0xEE)));
     l.m = _mm_movelh_ps(_mm_cvtpd_ps(s0), _mm_cvtpd_ps(s1));
   }
   return l;
+}
+
+// The largest sum of squares whose L2 magnitude fails the low threshold: the
+// magnitude grows with the sum, so blocks at or below it need no root.
+template <LowRule R>
+int32_t squaredLowLimit(float low) {
+  auto passes = [&](int64_t s) { return passesLow<R>(float(std::sqrt(double(s))), low); };
+  if (passes(0)) return -1;
+  int64_t fail = 0, pass = INT32_MAX;
+  if (!passes(pass)) return INT32_MAX;
+  while (pass - fail > 1) {
+    const int64_t mid = fail + (pass - fail) / 2;
+    (passes(mid) ? pass : fail) = mid;
+  }
+  return int32_t(fail);
 }
 
 inline MagnitudeLanes lanesFromFloat(__m128 dx, __m128 dy) {
@@ -143,18 +157,34 @@ inline void storeCodes8(uint8_t* codes, __m128i lo, __m128i hi) {
 }
 
 // Magnitudes of one row into mag[0 .. width) and codes into codes[0 .. width).
+// squaredLimit: squaredLowLimit<R>(low), used by the L2 norm only.
 template <LowRule R, Norm N>
-void magnitudeRow(const Zel16s* dx, const Zel16s* dy, int width, float low, float* mag, uint8_t* codes) {
+void magnitudeRow(const Zel16s* dx, const Zel16s* dy, int width, float low, int32_t squaredLimit, float* mag,
+                  uint8_t* codes) {
   const __m128 lowV = _mm_set1_ps(low);
+  const __m128i limitV = _mm_set1_epi32(squaredLimit);
   auto block = [&](int x) {
     __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(dx + x));
     __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(dy + x));
+    __m128i sq0 = _mm_setzero_si128(), sq1 = _mm_setzero_si128();
+    if (N == Norm::kL2) {
+      const __m128i p0 = _mm_unpacklo_epi16(a, b), p1 = _mm_unpackhi_epi16(a, b);
+      sq0 = _mm_madd_epi16(p0, p0);
+      sq1 = _mm_madd_epi16(p1, p1);
+      // Most of a picture lies below the low threshold: no roots there.
+      if (_mm_movemask_epi8(_mm_or_si128(_mm_cmpgt_epi32(sq0, limitV), _mm_cmpgt_epi32(sq1, limitV))) == 0) {
+        _mm_storeu_ps(mag + x, _mm_setzero_ps());
+        _mm_storeu_ps(mag + x + 4, _mm_setzero_ps());
+        _mm_storel_epi64(reinterpret_cast<__m128i*>(codes + x), _mm_set1_epi8(char(kNone)));
+        return;
+      }
+    }
     __m128i alo = _mm_srai_epi32(_mm_unpacklo_epi16(a, a), 16);
     __m128i ahi = _mm_srai_epi32(_mm_unpackhi_epi16(a, a), 16);
     __m128i blo = _mm_srai_epi32(_mm_unpacklo_epi16(b, b), 16);
     __m128i bhi = _mm_srai_epi32(_mm_unpackhi_epi16(b, b), 16);
-    __m128i c0 = finishLanes<R>(lanesFromInt32<N>(alo, blo), lowV, mag + x);
-    __m128i c1 = finishLanes<R>(lanesFromInt32<N>(ahi, bhi), lowV, mag + x + 4);
+    __m128i c0 = finishLanes<R>(lanesFromInt32<N>(alo, blo, sq0), lowV, mag + x);
+    __m128i c1 = finishLanes<R>(lanesFromInt32<N>(ahi, bhi, sq1), lowV, mag + x + 4);
     storeCodes8(codes + x, c0, c1);
   };
   if (width >= 8) {
@@ -166,7 +196,8 @@ void magnitudeRow(const Zel16s* dx, const Zel16s* dy, int width, float low, floa
 }
 
 template <LowRule R, Norm N>
-void magnitudeRow(const Zel32f* dx, const Zel32f* dy, int width, float low, float* mag, uint8_t* codes) {
+void magnitudeRow(const Zel32f* dx, const Zel32f* dy, int width, float low, int32_t /*squaredLimit*/, float* mag,
+                  uint8_t* codes) {
   const __m128 lowV = _mm_set1_ps(low);
   auto block = [&](int x) {
     __m128i c0 = finishLanes<R>(lanesFromFloat(_mm_loadu_ps(dx + x), _mm_loadu_ps(dy + x)), lowV, mag + x);
