@@ -12,10 +12,14 @@
 #include <cstdint>
 #include <cstring>
 
+#include "kernels/simd.h"
 #include "zelcv.h"
 
 namespace zelcv {
 namespace canny {
+
+using IntVec = simd::Vec<int16_t>;
+using FloatVec = simd::Vec<float>;
 
 // tan(22.5 degrees) and tan(67.5 degrees) as single-precision constants;
 // 2 + kTan22 is exactly kTan67 in single precision.
@@ -140,7 +144,7 @@ template <LowRule R>
 inline __m128i finishLanes(const MagnitudeLanes& l, __m128 low, float* mag) {
   __m128 keep = R == LowRule::kKeepEqual ? _mm_cmpnlt_ps(l.m, low) : _mm_cmpgt_ps(l.m, low);
   keep = _mm_and_ps(keep, _mm_cmpneq_ps(l.m, _mm_setzero_ps()));
-  _mm_storeu_ps(mag, _mm_and_ps(keep, l.m));
+  FloatVec::storeu(mag, _mm_and_ps(keep, l.m));
   const __m128i vertical = _mm_castps_si128(_mm_cmplt_ps(_mm_mul_ps(_mm_set1_ps(kTan67), l.ax), l.ay));
   const __m128i horizontal = _mm_castps_si128(_mm_cmplt_ps(l.ay, _mm_mul_ps(_mm_set1_ps(kTan22), l.ax)));
   // Diagonal codes 2 or 3; horizontal 0 overrides; vertical 1 overrides both.
@@ -164,8 +168,8 @@ void magnitudeRow(const Zel16s* dx, const Zel16s* dy, int width, float low, int3
   const __m128 lowV = _mm_set1_ps(low);
   const __m128i limitV = _mm_set1_epi32(squaredLimit);
   auto block = [&](int x) {
-    __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(dx + x));
-    __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(dy + x));
+    __m128i a = IntVec::loadu(dx + x);
+    __m128i b = IntVec::loadu(dy + x);
     __m128i sq0 = _mm_setzero_si128(), sq1 = _mm_setzero_si128();
     if (N == Norm::kL2) {
       const __m128i p0 = _mm_unpacklo_epi16(a, b), p1 = _mm_unpackhi_epi16(a, b);
@@ -173,8 +177,8 @@ void magnitudeRow(const Zel16s* dx, const Zel16s* dy, int width, float low, int3
       sq1 = _mm_madd_epi16(p1, p1);
       // Most of a picture lies below the low threshold: no roots there.
       if (_mm_movemask_epi8(_mm_or_si128(_mm_cmpgt_epi32(sq0, limitV), _mm_cmpgt_epi32(sq1, limitV))) == 0) {
-        _mm_storeu_ps(mag + x, _mm_setzero_ps());
-        _mm_storeu_ps(mag + x + 4, _mm_setzero_ps());
+        FloatVec::storeu(mag + x, _mm_setzero_ps());
+        FloatVec::storeu(mag + x + 4, _mm_setzero_ps());
         _mm_storel_epi64(reinterpret_cast<__m128i*>(codes + x), _mm_set1_epi8(char(kNone)));
         return;
       }
@@ -200,9 +204,9 @@ void magnitudeRow(const Zel32f* dx, const Zel32f* dy, int width, float low, int3
                   uint8_t* codes) {
   const __m128 lowV = _mm_set1_ps(low);
   auto block = [&](int x) {
-    __m128i c0 = finishLanes<R>(lanesFromFloat(_mm_loadu_ps(dx + x), _mm_loadu_ps(dy + x)), lowV, mag + x);
+    __m128i c0 = finishLanes<R>(lanesFromFloat(FloatVec::loadu(dx + x), FloatVec::loadu(dy + x)), lowV, mag + x);
     __m128i c1 =
-        finishLanes<R>(lanesFromFloat(_mm_loadu_ps(dx + x + 4), _mm_loadu_ps(dy + x + 4)), lowV, mag + x + 4);
+        finishLanes<R>(lanesFromFloat(FloatVec::loadu(dx + x + 4), FloatVec::loadu(dy + x + 4)), lowV, mag + x + 4);
     storeCodes8(codes + x, c0, c1);
   };
   if (width >= 8) {
@@ -231,11 +235,11 @@ inline bool localMaximum(uint8_t code, const float* up, const float* cur, const 
 
 // Local maxima of four pixels as an all-ones lane mask.
 inline __m128 localMaxima4(__m128i code, const float* up, const float* cur, const float* down) {
-  const __m128 m = _mm_loadu_ps(cur + 1);
-  const __m128 h = _mm_and_ps(_mm_cmplt_ps(_mm_loadu_ps(cur), m), _mm_cmple_ps(_mm_loadu_ps(cur + 2), m));
-  const __m128 v = _mm_and_ps(_mm_cmplt_ps(_mm_loadu_ps(up + 1), m), _mm_cmple_ps(_mm_loadu_ps(down + 1), m));
-  const __m128 d1 = _mm_and_ps(_mm_cmplt_ps(_mm_loadu_ps(down + 2), m), _mm_cmplt_ps(_mm_loadu_ps(up), m));
-  const __m128 d2 = _mm_and_ps(_mm_cmplt_ps(_mm_loadu_ps(down), m), _mm_cmplt_ps(_mm_loadu_ps(up + 2), m));
+  const __m128 m = FloatVec::loadu(cur + 1);
+  const __m128 h = _mm_and_ps(_mm_cmplt_ps(FloatVec::loadu(cur), m), _mm_cmple_ps(FloatVec::loadu(cur + 2), m));
+  const __m128 v = _mm_and_ps(_mm_cmplt_ps(FloatVec::loadu(up + 1), m), _mm_cmple_ps(FloatVec::loadu(down + 1), m));
+  const __m128 d1 = _mm_and_ps(_mm_cmplt_ps(FloatVec::loadu(down + 2), m), _mm_cmplt_ps(FloatVec::loadu(up), m));
+  const __m128 d2 = _mm_and_ps(_mm_cmplt_ps(FloatVec::loadu(down), m), _mm_cmplt_ps(FloatVec::loadu(up + 2), m));
   auto is = [&](int k) { return _mm_castsi128_ps(_mm_cmpeq_epi32(code, _mm_set1_epi32(k))); };
   __m128 r = _mm_and_ps(is(kHorizontal), h);
   r = _mm_or_ps(r, _mm_and_ps(is(kVertical), v));
@@ -253,7 +257,7 @@ void thinRow(const float* up, const float* cur, const float* down, const uint8_t
   const __m128i none = _mm_set1_epi8(char(kNone));
   const __m128i zero = _mm_setzero_si128();
   auto strongBits = [&](int x, __m128 maxima) {
-    int bits = _mm_movemask_ps(_mm_and_ps(maxima, _mm_cmpgt_ps(_mm_loadu_ps(cur + x + 1), highV)));
+    int bits = _mm_movemask_ps(_mm_and_ps(maxima, _mm_cmpgt_ps(FloatVec::loadu(cur + x + 1), highV)));
     for (; bits; bits &= bits - 1) {
       const int i = x + __builtin_ctz(unsigned(bits));
       dstRow[i] = kEdge;
@@ -262,7 +266,7 @@ void thinRow(const float* up, const float* cur, const float* down, const uint8_t
   };
   int x = 0;
   for (; x + 16 <= width; x += 16) {
-    const __m128i c = _mm_loadu_si128(reinterpret_cast<const __m128i*>(codes + x));
+    const __m128i c = IntVec::loadu(codes + x);
     if (_mm_movemask_epi8(_mm_cmpeq_epi8(c, none)) == 0xFFFF) continue;
     const __m128i c16lo = _mm_unpacklo_epi8(c, zero), c16hi = _mm_unpackhi_epi8(c, zero);
     const __m128i lanes[4] = {_mm_unpacklo_epi16(c16lo, zero), _mm_unpackhi_epi16(c16lo, zero),
@@ -275,7 +279,7 @@ void thinRow(const float* up, const float* cur, const float* down, const uint8_t
       strongBits(xk, maxima);
     }
     const __m128i bytes = _mm_packs_epi16(_mm_packs_epi32(masks[0], masks[1]), _mm_packs_epi32(masks[2], masks[3]));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(mapRow + x),
+    IntVec::storeu(mapRow + x,
                      _mm_and_si128(bytes, _mm_set1_epi8(char(kCandidate))));
   }
   for (; x < width; ++x) {

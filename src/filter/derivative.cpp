@@ -13,6 +13,8 @@ namespace zelcv {
 
 namespace {
 
+using IntVec = simd::Vec<int16_t>;
+
 // The arithmetic the formulas need, on plain integers and on eight 16-bit
 // lanes. Every intermediate value fits in 16 bits, so both give the same
 // results whatever the order of the additions.
@@ -81,14 +83,14 @@ void columnPass(const Zel8u* const* rows, int width, Zel16s* smooth, Zel16s* dif
     __m128i lo[n], hi[n];
     const __m128i zero = _mm_setzero_si128();
     for (int i = 0; i < n; ++i) {
-      __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(rows[i] + x));
+      __m128i v = IntVec::loadu(rows[i] + x);
       lo[i] = _mm_unpacklo_epi8(v, zero);
       hi[i] = _mm_unpackhi_epi8(v, zero);
     }
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(smooth + r + x), VT::smooth(lo));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(smooth + r + x + 8), VT::smooth(hi));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(diff + r + x), VT::differ(lo));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(diff + r + x + 8), VT::differ(hi));
+    IntVec::storeu(smooth + r + x, VT::smooth(lo));
+    IntVec::storeu(smooth + r + x + 8, VT::smooth(hi));
+    IntVec::storeu(diff + r + x, VT::differ(lo));
+    IntVec::storeu(diff + r + x + 8, VT::differ(hi));
   };
   if (width >= 16) {
     // The last block overlaps the one before it; it rewrites equal values.
@@ -112,11 +114,11 @@ void rowPass(const Zel16s* smooth, const Zel16s* diff, int width, Zel16s* dx, Ze
   auto block = [&](int x) {
     __m128i s[n], d[n];
     for (int i = 0; i < n; ++i) {
-      s[i] = _mm_loadu_si128(reinterpret_cast<const __m128i*>(smooth + x + i));
-      d[i] = _mm_loadu_si128(reinterpret_cast<const __m128i*>(diff + x + i));
+      s[i] = IntVec::loadu(smooth + x + i);
+      d[i] = IntVec::loadu(diff + x + i);
     }
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(dx + x), VT::differ(s));
-    _mm_storeu_si128(reinterpret_cast<__m128i*>(dy + x), VT::smooth(d));
+    IntVec::storeu(dx + x, VT::differ(s));
+    IntVec::storeu(dy + x, VT::smooth(d));
   };
   if (width >= 8) {
     for (int x = 0; x < width; x += 8) block(std::min(x, width - 8));
