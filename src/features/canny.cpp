@@ -110,13 +110,13 @@ template <Norm N>
 void cannyFromImage(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roi,
                     DerivativeKernel kernel, ZeliBorderType border, Zel8u borderValue, float low, float high,
                     Zel8u* buffer) {
-  const Workspace ws(buffer, roi);
+  // The derivative rows and their scratch come before the stack.
+  Workspace ws(buffer, roi);
   Zel16s* dx = reinterpret_cast<Zel16s*>(alignUp(ws.next, alignof(Zel16s)));
   Zel16s* dy = dx + roi.width;
   uint8_t* scratch = reinterpret_cast<uint8_t*>(dy + roi.width);
   const DerivativeRows rows(src, srcStep, roi, kernel, border, borderValue, scratch);
-  Workspace rest = ws;
-  rest.next = scratch + DerivativeRows::scratchBytes(kernel, roi.width);
+  ws.next = scratch + DerivativeRows::scratchBytes(kernel, roi.width);
   const int32_t squaredLimit = N == Norm::kL2 ? canny::squaredLowLimit<LowRule::kStrict>(low) : 0;
   auto produce = [&](int y, float* mag, uint8_t* codes) {
     rows.row(y, dx, dy);
@@ -124,9 +124,9 @@ void cannyFromImage(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, Zeli
   };
   // The size formula has room for four bytes a stack entry only.
   if (smallImage(roi))
-    detect<canny::Pair16>(rest, roi, high, dst, dstStep, produce);
+    detect<canny::Pair16>(ws, roi, high, dst, dstStep, produce);
   else
-    detect<canny::MapOffset32>(rest, roi, high, dst, dstStep, produce);
+    detect<canny::MapOffset32>(ws, roi, high, dst, dstStep, produce);
 }
 
 }  // namespace
