@@ -231,10 +231,11 @@ ZELCV_API ZelStatus zeliTiltedSqrIntegral_8u32f64f_C1R(const Zel8u* src, int src
  *   32s32f: as 32f, with S the exact 32-bit difference (wrapping, so that
  *   wrapped integrals still give the right sum) converted to double.
  *   32s_C1RSfs: both integrals 32s (as zeliSqrIntegral_8u32s_C1R makes them);
- *   S a signed and Q an unsigned 32-bit wrapping difference, everything else
- *   in double (inv = 1 / n exactly), the deviation multiplied by
- *   2^-scaleFactor, rounded to nearest (ties to even), saturated to Zel32s.
- *   Any scaleFactor is accepted.
+ *   S a signed and Q an unsigned 32-bit wrapping difference; the variance is
+ *   (n x Q - S^2) / n^2 in double precision (so a constant area gives exactly
+ *   0 while n x Q stays below 2^53); the double square root is multiplied by
+ *   2^-scaleFactor, rounded to nearest (ties to even) and saturated to
+ *   Zel32s. Any scaleFactor is accepted.
  * Checks, in this order: null src, sqr or dst -8; w or h < 1 -6;
  * srcStep < (w + rect.x + rect.width) x element size, dstStep < w x element
  * size or sqrStep < (w + rect.x + rect.width) x element size -14; a step not

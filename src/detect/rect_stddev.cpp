@@ -9,6 +9,7 @@ namespace zelcv {
 namespace {
 
 using rectstd::Corners;
+using rectstd::Moments;
 
 // A corner relative to the rectangle's anchor (rect.x, rect.y).
 struct Offset {
@@ -42,7 +43,7 @@ Corners<T> cornersAt(const T* base, int step, const ZeliRect& r, const Offset of
 
 // Pointers, size, steps (the integrals must reach w + rect.x + rect.width
 // columns), alignment, and only then the rectangle itself.
-template <class Sum, class Sq, class Out>
+template <class Sum, class Sq, class Out, Moments M = Moments::MeanSquare>
 ZelStatus rectStdDev(Shape shape, const typename Sum::T* src, int srcStep,
                      const typename Sq::T* sqr, int sqrStep, typename Out::T* dst, int dstStep,
                      ZeliSize roi, ZeliRect rect, int scaleFactor) {
@@ -58,16 +59,17 @@ ZelStatus rectStdDev(Shape shape, const typename Sum::T* src, int srcStep,
   int64_t pixels = int64_t(rect.width) * rect.height * (shape == Shape::Tilted ? 2 : 1);
   // The floating results take the count as a single-precision value; the
   // scaled integer result keeps it exact.
-  const bool exact = std::is_same<Out, rectstd::Out32sScaled>::value;
-  double inv = 1.0 / (exact ? double(pixels) : double(float(pixels)));
+  double n = M == Moments::MeanSquare ? double(float(pixels)) : double(pixels);
+  double inv = 1.0 / n;
+  // Clamped so that the scale stays finite: 0 x scale must stay 0.
   double scale = std::ldexp(1.0, -(scaleFactor < -1023 ? -1023 : scaleFactor));
 
   Offset off[4];
   cornerOffsets(shape, rect, off);
   for (int y = 0; y < roi.height; ++y)
-    rectstd::stdDevRow<Sum, Sq, Out>(cornersAt(src, srcStep, rect, off, y),
-                                     cornersAt(sqr, sqrStep, rect, off, y), rowAt(dst, dstStep, y),
-                                     roi.width, inv, scale, true);
+    rectstd::stdDevRow<Sum, Sq, Out, M>(cornersAt(src, srcStep, rect, off, y),
+                                        cornersAt(sqr, sqrStep, rect, off, y),
+                                        rowAt(dst, dstStep, y), roi.width, inv, n, scale, true);
   return zelStatusOk;
 }
 
@@ -99,7 +101,7 @@ ZELCV_ENTRY(zeliRectStdDev_32s32f_C1R)(const Zel32s* src, int srcStep, const Zel
 ZELCV_ENTRY(zeliRectStdDev_32s_C1RSfs)(const Zel32s* src, int srcStep, const Zel32s* sqr,
                                        int sqrStep, Zel32s* dst, int dstStep, ZeliSize roiSize,
                                        ZeliRect rect, int scaleFactor) {
-  return rectStdDev<Sum32s, SumSq32u, Out32sScaled>(Shape::Upright, asUnsigned(src), srcStep,
+  return rectStdDev<Sum32s, SumSq32u, Out32sScaled, Moments::Numerator>(Shape::Upright, asUnsigned(src), srcStep,
                                                     asUnsigned(sqr), sqrStep, dst, dstStep,
                                                     roiSize, rect, scaleFactor);
 }
@@ -121,7 +123,7 @@ ZELCV_ENTRY(zeliTiltedRectStdDev_32s32f_C1R)(const Zel32s* src, int srcStep, con
 ZELCV_ENTRY(zeliTiltedRectStdDev_32s_C1RSfs)(const Zel32s* src, int srcStep, const Zel32s* sqr,
                                              int sqrStep, Zel32s* dst, int dstStep,
                                              ZeliSize roiSize, ZeliRect rect, int scaleFactor) {
-  return rectStdDev<Sum32s, SumSq32u, Out32sScaled>(Shape::Tilted, asUnsigned(src), srcStep,
+  return rectStdDev<Sum32s, SumSq32u, Out32sScaled, Moments::Numerator>(Shape::Tilted, asUnsigned(src), srcStep,
                                                     asUnsigned(sqr), sqrStep, dst, dstStep,
                                                     roiSize, rect, scaleFactor);
 }

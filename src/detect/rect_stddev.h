@@ -128,29 +128,54 @@ struct Out32sScaled {
   }
 };
 
-// mean = S x inv, variance = Q x inv - mean^2, all in double.
-template <class Sum, class Sq, class Out>
+// How the variance comes from S, Q and the count n.
+enum class Moments {
+  MeanSquare,  // mean = S x inv, variance = Q x inv - mean^2
+  Numerator,   // variance = (n x Q - S^2) / n^2: exact 0 for a constant area
+};
+
+template <Moments M>
+inline double variance(double S, double Q, double inv, double n, double nn) {
+  if (M == Moments::MeanSquare) {
+    double mean = S * inv;
+    double sq = Q * inv;
+    double mm = mean * mean;
+    return sq - mm;
+  }
+  double nq = n * Q;
+  double ss = S * S;
+  return (nq - ss) / nn;
+}
+
+template <Moments M>
+inline __m128d variance2(__m128d S, __m128d Q, __m128d inv, __m128d n, __m128d nn) {
+  if (M == Moments::MeanSquare) {
+    __m128d mean = _mm_mul_pd(S, inv);
+    return _mm_sub_pd(_mm_mul_pd(Q, inv), _mm_mul_pd(mean, mean));
+  }
+  return _mm_div_pd(_mm_sub_pd(_mm_mul_pd(n, Q), _mm_mul_pd(S, S)), nn);
+}
+
+// One output row; all arithmetic in double.
+template <class Sum, class Sq, class Out, Moments M>
 inline void stdDevRow(const Corners<typename Sum::T>& s, const Corners<typename Sq::T>& q,
-                      typename Out::T* out, int w, double inv, double scale, bool useSimd) {
+                      typename Out::T* out, int w, double inv, double n, double scale,
+                      bool useSimd) {
+  const double nn = n * n;
   int x = 0;
   if (useSimd) {
-    const __m128d vinv = _mm_set1_pd(inv), vscale = _mm_set1_pd(scale);
+    const __m128d vinv = _mm_set1_pd(inv), vn = _mm_set1_pd(n), vnn = _mm_set1_pd(nn);
+    const __m128d vscale = _mm_set1_pd(scale);
     for (; x + 4 <= w; x += 4) {
       __m128d slo, shi, qlo, qhi;
       Sum::sum4(s, x, slo, shi);
       Sq::sum4(q, x, qlo, qhi);
-      __m128d mlo = _mm_mul_pd(slo, vinv), mhi = _mm_mul_pd(shi, vinv);
-      __m128d vlo = _mm_sub_pd(_mm_mul_pd(qlo, vinv), _mm_mul_pd(mlo, mlo));
-      __m128d vhi = _mm_sub_pd(_mm_mul_pd(qhi, vinv), _mm_mul_pd(mhi, mhi));
-      Out::finish4(out + x, vlo, vhi, vscale);
+      Out::finish4(out + x, variance2<M>(slo, qlo, vinv, vn, vnn),
+                   variance2<M>(shi, qhi, vinv, vn, vnn), vscale);
     }
   }
-  for (; x < w; ++x) {
-    double mean = Sum::sum(s, x) * inv;
-    double sq = Sq::sum(q, x) * inv;
-    double mm = mean * mean;
-    out[x] = Out::finish(sq - mm, scale);
-  }
+  for (; x < w; ++x)
+    out[x] = Out::finish(variance<M>(Sum::sum(s, x), Sq::sum(q, x), inv, n, nn), scale);
 }
 
 }  // namespace rectstd
