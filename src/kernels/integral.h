@@ -102,22 +102,24 @@ inline void integralRowScalar(const uint8_t* src, const typename Sum::T* above, 
   }
 }
 
-// Sixteen pixels per step: prefix sums inside the vector by shifted adds
-// (16-bit lanes are wide enough for 8 bytes), the carry broadcast from the
-// last lane. Returns the number of pixels done; the scalar kernel finishes.
+// Sixteen pixels per step. The prefix sums run over the eight pairs of
+// neighbouring pixels (16-bit lanes hold up to 16 x 255), which needs half
+// the shifts of a per-pixel prefix; the even pixels' prefix is the pair
+// prefix less the odd pixel. The block's offset `carry` is broadcast from its
+// last lane. Returns where it stopped; the scalar kernel finishes the row.
 template <class Sum, class Sq>
 inline int integralRowSimd(const uint8_t* src, const typename Sum::T* above, typename Sum::T* out,
-                           const typename Sq::T* aboveSq, typename Sq::T* outSq, int w, uint32_t& run,
-                           uint32_t& runSq) {
+                           const typename Sq::T* aboveSq, typename Sq::T* outSq, int from, int w,
+                           uint32_t& run, uint32_t& runSq) {
   const __m128i zero = _mm_setzero_si128();
+  const __m128i lowBytes = _mm_set1_epi16(0x00FF);
   __m128i carry = _mm_set1_epi32(int32_t(run));
   __m128i carrySq = _mm_set1_epi32(int32_t(runSq));
-  int x = 0;
+  int x = from;
   for (; x + 16 <= w; x += 16) {
     __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(src + x));
-    __m128i lo = _mm_unpacklo_epi8(v, zero);
-    __m128i hi = _mm_unpackhi_epi8(v, zero);
     if constexpr (!std::is_same<Sq, NoPlane>::value) {
+      __m128i lo = _mm_unpacklo_epi8(v, zero), hi = _mm_unpackhi_epi8(v, zero);
       __m128i q[4] = {_mm_unpacklo_epi16(lo, zero), _mm_unpackhi_epi16(lo, zero),
                       _mm_unpacklo_epi16(hi, zero), _mm_unpackhi_epi16(hi, zero)};
       for (int k = 0; k < 4; ++k) {
@@ -126,17 +128,18 @@ inline int integralRowSimd(const uint8_t* src, const typename Sum::T* above, typ
         carrySq = lastLane(s);
       }
     }
-    lo = _mm_add_epi16(lo, _mm_slli_si128(lo, 2));
-    hi = _mm_add_epi16(hi, _mm_slli_si128(hi, 2));
-    lo = _mm_add_epi16(lo, _mm_slli_si128(lo, 4));
-    hi = _mm_add_epi16(hi, _mm_slli_si128(hi, 4));
-    lo = _mm_add_epi16(lo, _mm_slli_si128(lo, 8));
-    hi = _mm_add_epi16(hi, _mm_slli_si128(hi, 8));
+    __m128i odd = _mm_srli_epi16(v, 8);
+    __m128i pairs = _mm_add_epi16(_mm_and_si128(v, lowBytes), odd);
+    pairs = _mm_add_epi16(pairs, _mm_slli_si128(pairs, 2));
+    pairs = _mm_add_epi16(pairs, _mm_slli_si128(pairs, 4));
+    pairs = _mm_add_epi16(pairs, _mm_slli_si128(pairs, 8));
+    __m128i evenPrefix = _mm_sub_epi16(pairs, odd);
+    __m128i lo = _mm_unpacklo_epi16(evenPrefix, pairs);  // pixels 0..7
+    __m128i hi = _mm_unpackhi_epi16(evenPrefix, pairs);  // pixels 8..15
     __m128i p0 = _mm_add_epi32(_mm_unpacklo_epi16(lo, zero), carry);
     __m128i p1 = _mm_add_epi32(_mm_unpackhi_epi16(lo, zero), carry);
-    __m128i mid = lastLane(p1);
-    __m128i p2 = _mm_add_epi32(_mm_unpacklo_epi16(hi, zero), mid);
-    __m128i p3 = _mm_add_epi32(_mm_unpackhi_epi16(hi, zero), mid);
+    __m128i p2 = _mm_add_epi32(_mm_unpacklo_epi16(hi, zero), carry);
+    __m128i p3 = _mm_add_epi32(_mm_unpackhi_epi16(hi, zero), carry);
     Sum::store4(out + x, above + x, p0);
     Sum::store4(out + x + 4, above + x + 4, p1);
     Sum::store4(out + x + 8, above + x + 8, p2);
@@ -157,8 +160,13 @@ inline void integralRow(const uint8_t* src, const typename Sum::T* above, typena
   int done = 0;
   // A float plane converts lanes as signed: exact only while sums stay below
   // 2^31, which a row narrower than 2^31 / 255 guarantees.
-  if (useSimd && (Sum::kSignedConversionExact || w <= 8421504))
-    done = integralRowSimd<Sum, Sq>(src, above, out, aboveSq, outSq, w, run, runSq);
+  if (useSimd && (Sum::kSignedConversionExact || w <= 8421504)) {
+    // Scalar up to the first 16-byte boundary of the sums, so that no store
+    // of the sums splits a cache line.
+    int head = w < 16 ? 0 : int(((16 - (reinterpret_cast<uintptr_t>(out) & 15)) & 15) / sizeof(out[0]));
+    integralRowScalar<Sum, Sq>(src, above, out, aboveSq, outSq, 0, head, run, runSq);
+    done = integralRowSimd<Sum, Sq>(src, above, out, aboveSq, outSq, head, w, run, runSq);
+  }
   integralRowScalar<Sum, Sq>(src, above, out, aboveSq, outSq, done, w, run, runSq);
 }
 
