@@ -43,10 +43,7 @@ void integralImage(const uint8_t* src, int srcStep, typename Sum::T* dst, int ds
 template <class Sum>
 ZelStatus plainIntegral(const Zel8u* src, int srcStep, typename Sum::T* dst, int dstStep,
                         ZeliSize roi, typename Sum::T val) {
-  if (ZelStatus s = checkIntegralArgs({src, dst}, roi,
-                                      {stepNeed<Zel8u>(srcStep, roi.width),
-                                       stepNeed<typename Sum::T>(dstStep, int64_t(roi.width) + 1)}))
-    return s;
+  if (ZelStatus s = check8uIntegral(src, srcStep, dst, dstStep, roi, 1)) return s;
   integralImage<Sum, NoPlane>(src, srcStep, dst, dstStep, nullptr, 0, roi, val, 0);
   return zelStatusOk;
 }
@@ -55,12 +52,7 @@ template <class Sum, class Sq>
 ZelStatus sqrIntegral(const Zel8u* src, int srcStep, typename Sum::T* dst, int dstStep,
                       typename Sq::T* sqr, int sqrStep, ZeliSize roi, typename Sum::T val,
                       typename Sq::T valSqr) {
-  const int64_t cols = int64_t(roi.width) + 1;
-  if (ZelStatus s = checkIntegralArgs({src, dst, sqr}, roi,
-                                      {stepNeed<Zel8u>(srcStep, roi.width),
-                                       stepNeed<typename Sum::T>(dstStep, cols),
-                                       stepNeed<typename Sq::T>(sqrStep, cols)}))
-    return s;
+  if (ZelStatus s = check8uIntegral(src, srcStep, dst, dstStep, sqr, sqrStep, roi, 1)) return s;
   integralImage<Sum, Sq>(src, srcStep, dst, dstStep, sqr, sqrStep, roi, val, valSqr);
   return zelStatusOk;
 }

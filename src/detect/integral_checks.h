@@ -42,6 +42,23 @@ inline ZelStatus checkIntegralArgs(std::initializer_list<const void*> pointers, 
   return checkStepNeeds(needs);
 }
 
+// An 8u source of w columns and outputs of w + extraCols columns.
+template <typename SumT>
+inline ZelStatus check8uIntegral(const Zel8u* src, int srcStep, const SumT* dst, int dstStep,
+                                 ZeliSize roi, int extraCols) {
+  return checkIntegralArgs({src, dst}, roi,
+                           {stepNeed<Zel8u>(srcStep, roi.width),
+                            stepNeed<SumT>(dstStep, int64_t(roi.width) + extraCols)});
+}
+template <typename SumT, typename SqT>
+inline ZelStatus check8uIntegral(const Zel8u* src, int srcStep, const SumT* dst, int dstStep,
+                                 const SqT* sqr, int sqrStep, ZeliSize roi, int extraCols) {
+  const int64_t cols = int64_t(roi.width) + extraCols;
+  return checkIntegralArgs({src, dst, sqr}, roi,
+                           {stepNeed<Zel8u>(srcStep, roi.width), stepNeed<SumT>(dstStep, cols),
+                            stepNeed<SqT>(sqrStep, cols)});
+}
+
 template <typename T>
 inline T* rowAt(T* base, int step, int64_t row) {
   using Byte = typename std::conditional<std::is_const<T>::value, const uint8_t, uint8_t>::type;

@@ -29,10 +29,7 @@ void tiltedImage(const uint8_t* src, int srcStep, typename Plane::T* dst, int ds
 template <class Plane>
 ZelStatus tiltedIntegral(const Zel8u* src, int srcStep, typename Plane::T* dst, int dstStep,
                          ZeliSize roi, typename Plane::T val, TiltEdge edge) {
-  if (ZelStatus s = checkIntegralArgs({src, dst}, roi,
-                                      {stepNeed<Zel8u>(srcStep, roi.width),
-                                       stepNeed<typename Plane::T>(dstStep, int64_t(roi.width) + 2)}))
-    return s;
+  if (ZelStatus s = check8uIntegral(src, srcStep, dst, dstStep, roi, 2)) return s;
   tiltedImage<Plane, false>(src, srcStep, dst, dstStep, roi, val, edge);
   return zelStatusOk;
 }
@@ -42,12 +39,7 @@ template <class Sum, class Sq>
 ZelStatus tiltedSqrIntegral(const Zel8u* src, int srcStep, typename Sum::T* dst, int dstStep,
                             typename Sq::T* sqr, int sqrStep, ZeliSize roi, typename Sum::T val,
                             typename Sq::T valSqr) {
-  const int64_t cols = int64_t(roi.width) + 2;
-  if (ZelStatus s = checkIntegralArgs({src, dst, sqr}, roi,
-                                      {stepNeed<Zel8u>(srcStep, roi.width),
-                                       stepNeed<typename Sum::T>(dstStep, cols),
-                                       stepNeed<typename Sq::T>(sqrStep, cols)}))
-    return s;
+  if (ZelStatus s = check8uIntegral(src, srcStep, dst, dstStep, sqr, sqrStep, roi, 2)) return s;
   tiltedImage<Sum, false>(src, srcStep, dst, dstStep, roi, val, TiltEdge::ReadRight);
   tiltedImage<Sq, true>(src, srcStep, sqr, sqrStep, roi, valSqr, TiltEdge::ReadRight);
   return zelStatusOk;
