@@ -156,7 +156,12 @@ ZELCV_API ZelStatus zeliPyramidLayerUpFree_32f_C3R(ZeliPyramidLayerState* state)
  * sum of the squared pixels. Each row is built from a running sum of the
  * source row (a 32-bit unsigned integer for 8u sources, converted once to the
  * output's floating type; single precision for 32f sources) added to the row
- * above. 32s outputs wrap modulo 2^32; they are never saturated. */
+ * above. 32s outputs wrap modulo 2^32; they are never saturated.
+ * Checks: null src, dst (or sqr) -8; w or h < 1 -6; srcStep < w x source
+ * element size, dstStep (sqrStep) < (w + 1) x output element size -14; a
+ * step of a 32- or 64-bit image not a multiple of its element size -108
+ * (8u source steps are never tested for alignment). The tilted members check
+ * the same way with w + 2 output columns. */
 ZELCV_API ZelStatus zeliIntegral_8u32s_C1R(const Zel8u* src, int srcStep, Zel32s* dst, int dstStep,
                                            ZeliSize roiSize, Zel32s val);
 ZELCV_API ZelStatus zeliIntegral_8u32f_C1R(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep,
