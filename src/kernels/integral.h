@@ -160,13 +160,8 @@ inline void integralRow(const uint8_t* src, const typename Sum::T* above, typena
   int done = 0;
   // A float plane converts lanes as signed: exact only while sums stay below
   // 2^31, which a row narrower than 2^31 / 255 guarantees.
-  if (useSimd && (Sum::kSignedConversionExact || w <= 8421504)) {
-    // Scalar up to the first 16-byte boundary of the sums, so that no store
-    // of the sums splits a cache line.
-    int head = w < 16 ? 0 : int(((16 - (reinterpret_cast<uintptr_t>(out) & 15)) & 15) / sizeof(out[0]));
-    integralRowScalar<Sum, Sq>(src, above, out, aboveSq, outSq, 0, head, run, runSq);
-    done = integralRowSimd<Sum, Sq>(src, above, out, aboveSq, outSq, head, w, run, runSq);
-  }
+  if (useSimd && (Sum::kSignedConversionExact || w <= 8421504))
+    done = integralRowSimd<Sum, Sq>(src, above, out, aboveSq, outSq, 0, w, run, runSq);
   integralRowScalar<Sum, Sq>(src, above, out, aboveSq, outSq, done, w, run, runSq);
 }
 
