@@ -1,5 +1,8 @@
 // Integral images against cv::integral: sums; sums and squares; sums,
 // squares and tilted sums, with output types matched where both offer them.
+// OpenCV dispatches its sum-only integral to 512-bit code where the processor
+// has it; to compare like with like (128-bit vectors) run with
+//   OPENCV_CPU_DISABLE=AVX512-SKX,AVX2,FMA3,AVX
 #include <opencv2/imgproc.hpp>
 
 #include "harness.h"
