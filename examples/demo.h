@@ -24,5 +24,6 @@ int demoCheck(const char* what, ZelStatus status);
 
 /* Family steps. */
 int demoCanny(const DemoImage* image, const char* outDir);
+int demoIntegral(const DemoImage* image, const char* outDir);
 
 #endif
