@@ -22,7 +22,9 @@ int demoWritePgm(const char* outDir, const char* name, const Zel8u* pixels, int 
 /* Reports a failed call and returns 1, or returns 0 for zelStatusOk. */
 int demoCheck(const char* what, ZelStatus status);
 
-/* Flat morphology: dilation and erosion with a disc (demo_morph.c). */
+/* Family steps. */
+int demoCanny(const DemoImage* image, const char* outDir);
+int demoIntegral(const DemoImage* image, const char* outDir);
 int demoMorph(const DemoImage* image, const char* outDir);
 
 #endif

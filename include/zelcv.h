@@ -148,6 +148,44 @@ ZELCV_API ZelStatus zeliPyramidLayerUpFree_32f_C3R(ZeliPyramidLayerState* state)
 
 /* ---- Separable filter pipeline ----------------------------------------- */
 
+/* ---- Canny edge detector ----------------------------------------------- */
+/* Edge map: 255 on edge pixels, 0 elsewhere. The magnitude is thinned along
+ * the quantised gradient direction (a plateau across an edge keeps its
+ * first pixel, leftmost or topmost); candidates above the low threshold join
+ * the edges 8-connected to a pixel strictly above the high threshold.
+ * Thresholds: 0 <= low <= high, else zelStatusBadArgument (also for NaN).
+ * A size whose work buffer would exceed INT_MAX bytes gives zelStatusBadSize
+ * from the queries and the operations alike. */
+enum { zelFilterSobel = 2, zelFilterScharr = 5 };    /* derivative kernel kinds */
+enum { zelMaskSize3x3 = 33, zelMaskSize5x5 = 55 };
+enum { zelNormL1 = 2, zelNormL2 = 4 };                /* |dx| + |dy|; sqrt(dx^2 + dy^2) */
+
+/* Work buffer bytes for zeliCanny_16s8u_C1R and zeliCanny_32f8u_C1R. */
+ZELCV_API ZelStatus zeliCannyGetSize(ZeliSize roiSize, int* bufferSize);
+/* Work buffer bytes for zeliCannyBorder_8u_C1R; filterType and norm are not
+ * examined. */
+ZELCV_API ZelStatus zeliCannyBorderGetSize(ZeliSize roiSize, int filterType, int mask, int norm,
+                                           int* bufferSize);
+/* From precomputed derivatives; magnitude |dx| + |dy|, kept when >= low. */
+ZELCV_API ZelStatus zeliCanny_16s8u_C1R(const Zel16s* srcDx, int srcDxStep, const Zel16s* srcDy,
+                                        int srcDyStep, Zel8u* dst, int dstStep, ZeliSize roiSize,
+                                        Zel32f lowThreshold, Zel32f highThreshold, Zel8u* buffer);
+ZELCV_API ZelStatus zeliCanny_32f8u_C1R(const Zel32f* srcDx, int srcDxStep, const Zel32f* srcDy,
+                                        int srcDyStep, Zel8u* dst, int dstStep, ZeliSize roiSize,
+                                        Zel32f lowThreshold, Zel32f highThreshold, Zel8u* buffer);
+/* From an 8-bit image: 3x3 Sobel or Scharr, or 5x5 Sobel derivatives with
+ * borders zelBorderConstant (borderValue), zelBorderReplicate or
+ * zelBorderInMemory / the in-memory side flags (a pixel outside both a row
+ * and a column end follows the vertical rule, then the horizontal one); the
+ * norm is zelNormL1 or zelNormL2 (double precision); a magnitude is kept only
+ * when > low. Checks: mask size (-33) before the pointers (-8), then size
+ * (-6), steps (-14), filter/norm/thresholds (-5), border kind (-225). */
+ZELCV_API ZelStatus zeliCannyBorder_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
+                                           ZeliSize roiSize, int filterType, int mask,
+                                           ZeliBorderType borderType, Zel8u borderValue,
+                                           Zel32f lowThreshold, Zel32f highThreshold, int norm,
+                                           Zel8u* buffer);
+
 /* ---- Flat morphology: min/max filters, dilation, erosion -------------- */
 /* The element (mask) is maskSize.width x maskSize.height bytes without row
  * padding; non-zero bytes are on. Dilation writes the maximum over the on
@@ -174,98 +212,421 @@ ZELCV_API ZelStatus zeliPyramidLayerUpFree_32f_C3R(ZeliPyramidLayerState* state)
  * significant bit of its byte; a bit offset of 8 or more advances the row
  * pointer by whole bytes. Bits of the destination bytes outside the ROI are
  * kept. Dilation is OR, erosion AND over the on elements. */
-ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMinBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMinBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMinBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMinBorderReplicate_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMinBorderReplicate_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMinBorderReplicate_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliSize maskSize, ZeliPoint anchor, Zel8u* buffer);
-ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_8u_C1R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_8u_C3R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_8u_C4R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_32f_C1R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_32f_C3R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_32f_C4R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMinGetBufferSize_8u_C1R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMinGetBufferSize_8u_C3R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMinGetBufferSize_8u_C4R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMinGetBufferSize_32f_C1R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMinGetBufferSize_32f_C3R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliFilterMinGetBufferSize_32f_C4R(int roiWidth, ZeliSize maskSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyGetSize_8u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, int* stateSize);
-ZELCV_API ZelStatus zeliMorphologyInit_8u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliMorphologyInitAlloc_8u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState** stateOut);
-ZELCV_API ZelStatus zeliMorphologyGetSize_8u_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, int* stateSize);
-ZELCV_API ZelStatus zeliMorphologyInit_8u_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliMorphologyInitAlloc_8u_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState** stateOut);
-ZELCV_API ZelStatus zeliMorphologyGetSize_8u_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, int* stateSize);
-ZELCV_API ZelStatus zeliMorphologyInit_8u_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliMorphologyInitAlloc_8u_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState** stateOut);
-ZELCV_API ZelStatus zeliMorphologyGetSize_32f_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, int* stateSize);
-ZELCV_API ZelStatus zeliMorphologyInit_32f_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliMorphologyInitAlloc_32f_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState** stateOut);
-ZELCV_API ZelStatus zeliMorphologyGetSize_32f_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, int* stateSize);
-ZELCV_API ZelStatus zeliMorphologyInit_32f_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliMorphologyInitAlloc_32f_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState** stateOut);
-ZELCV_API ZelStatus zeliMorphologyGetSize_32f_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, int* stateSize);
-ZELCV_API ZelStatus zeliMorphologyInit_32f_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliMorphologyInitAlloc_32f_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliPoint anchor, ZeliMorphState** stateOut);
-ZELCV_API ZelStatus zeliDilateBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliDilateBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliDilateBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliDilateBorderReplicate_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliDilateBorderReplicate_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliDilateBorderReplicate_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliErodeBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliErodeBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliErodeBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliErodeBorderReplicate_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliErodeBorderReplicate_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliErodeBorderReplicate_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, ZeliMorphState* state);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_8u_C1R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_8u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_8u_C3R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_8u_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_8u_C4R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_8u_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_32f_C1R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_32f_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_32f_C3R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_32f_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_32f_C4R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_32f_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_16u_C1R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_16u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_16s_C1R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_16s_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliMorphologyBorderGetSize_1u_C1R(int roiWidth, ZeliSize maskSize, int* stateSize, int* bufferSize);
-ZELCV_API ZelStatus zeliMorphologyBorderInit_1u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize, ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel8u borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel8u borderValue[3], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel8u borderValue[4], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel32f borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel32f borderValue[3], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel32f borderValue[4], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_16u_C1R(const Zel16u* src, int srcStep, Zel16u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel16u borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_16s_C1R(const Zel16s* src, int srcStep, Zel16s* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel16s borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliDilateBorder_1u_C1R(const Zel8u* src, int srcStep, int srcBitOffset, Zel8u* dst, int dstStep, int dstBitOffset, ZeliSize roiSize, ZeliBorderType borderType, Zel8u borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel8u borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel8u borderValue[3], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel8u borderValue[4], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel32f borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel32f borderValue[3], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, const Zel32f borderValue[4], const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_16u_C1R(const Zel16u* src, int srcStep, Zel16u* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel16u borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_16s_C1R(const Zel16s* src, int srcStep, Zel16s* dst, int dstStep, ZeliSize roiSize, ZeliBorderType borderType, Zel16s borderValue, const ZeliMorphState* state, Zel8u* buffer);
-ZELCV_API ZelStatus zeliErodeBorder_1u_C1R(const Zel8u* src, int srcStep, int srcBitOffset, Zel8u* dst, int dstStep, int dstBitOffset, ZeliSize roiSize, ZeliBorderType borderType, Zel8u borderValue, const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                        int dstStep, ZeliSize roiSize,
+                                                        ZeliSize maskSize, ZeliPoint anchor,
+                                                        Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                        int dstStep, ZeliSize roiSize,
+                                                        ZeliSize maskSize, ZeliPoint anchor,
+                                                        Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                        int dstStep, ZeliSize roiSize,
+                                                        ZeliSize maskSize, ZeliPoint anchor,
+                                                        Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_32f_C1R(const Zel32f* src, int srcStep,
+                                                         Zel32f* dst, int dstStep, ZeliSize roiSize,
+                                                         ZeliSize maskSize, ZeliPoint anchor,
+                                                         Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_32f_C3R(const Zel32f* src, int srcStep,
+                                                         Zel32f* dst, int dstStep, ZeliSize roiSize,
+                                                         ZeliSize maskSize, ZeliPoint anchor,
+                                                         Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMaxBorderReplicate_32f_C4R(const Zel32f* src, int srcStep,
+                                                         Zel32f* dst, int dstStep, ZeliSize roiSize,
+                                                         ZeliSize maskSize, ZeliPoint anchor,
+                                                         Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMinBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                        int dstStep, ZeliSize roiSize,
+                                                        ZeliSize maskSize, ZeliPoint anchor,
+                                                        Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMinBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                        int dstStep, ZeliSize roiSize,
+                                                        ZeliSize maskSize, ZeliPoint anchor,
+                                                        Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMinBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                        int dstStep, ZeliSize roiSize,
+                                                        ZeliSize maskSize, ZeliPoint anchor,
+                                                        Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMinBorderReplicate_32f_C1R(const Zel32f* src, int srcStep,
+                                                         Zel32f* dst, int dstStep, ZeliSize roiSize,
+                                                         ZeliSize maskSize, ZeliPoint anchor,
+                                                         Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMinBorderReplicate_32f_C3R(const Zel32f* src, int srcStep,
+                                                         Zel32f* dst, int dstStep, ZeliSize roiSize,
+                                                         ZeliSize maskSize, ZeliPoint anchor,
+                                                         Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMinBorderReplicate_32f_C4R(const Zel32f* src, int srcStep,
+                                                         Zel32f* dst, int dstStep, ZeliSize roiSize,
+                                                         ZeliSize maskSize, ZeliPoint anchor,
+                                                         Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_8u_C1R(int roiWidth, ZeliSize maskSize,
+                                                      int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_8u_C3R(int roiWidth, ZeliSize maskSize,
+                                                      int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_8u_C4R(int roiWidth, ZeliSize maskSize,
+                                                      int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_32f_C1R(int roiWidth, ZeliSize maskSize,
+                                                       int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_32f_C3R(int roiWidth, ZeliSize maskSize,
+                                                       int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMaxGetBufferSize_32f_C4R(int roiWidth, ZeliSize maskSize,
+                                                       int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMinGetBufferSize_8u_C1R(int roiWidth, ZeliSize maskSize,
+                                                      int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMinGetBufferSize_8u_C3R(int roiWidth, ZeliSize maskSize,
+                                                      int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMinGetBufferSize_8u_C4R(int roiWidth, ZeliSize maskSize,
+                                                      int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMinGetBufferSize_32f_C1R(int roiWidth, ZeliSize maskSize,
+                                                       int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMinGetBufferSize_32f_C3R(int roiWidth, ZeliSize maskSize,
+                                                       int* bufferSize);
+ZELCV_API ZelStatus zeliFilterMinGetBufferSize_32f_C4R(int roiWidth, ZeliSize maskSize,
+                                                       int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyGetSize_8u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                                 int* stateSize);
+ZELCV_API ZelStatus zeliMorphologyInit_8u_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                              ZeliPoint anchor, ZeliMorphState* state);
+ZELCV_API ZelStatus zeliMorphologyInitAlloc_8u_C1R(int roiWidth, const Zel8u* mask,
+                                                   ZeliSize maskSize, ZeliPoint anchor,
+                                                   ZeliMorphState** stateOut);
+ZELCV_API ZelStatus zeliMorphologyGetSize_8u_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                                 int* stateSize);
+ZELCV_API ZelStatus zeliMorphologyInit_8u_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                              ZeliPoint anchor, ZeliMorphState* state);
+ZELCV_API ZelStatus zeliMorphologyInitAlloc_8u_C3R(int roiWidth, const Zel8u* mask,
+                                                   ZeliSize maskSize, ZeliPoint anchor,
+                                                   ZeliMorphState** stateOut);
+ZELCV_API ZelStatus zeliMorphologyGetSize_8u_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                                 int* stateSize);
+ZELCV_API ZelStatus zeliMorphologyInit_8u_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                              ZeliPoint anchor, ZeliMorphState* state);
+ZELCV_API ZelStatus zeliMorphologyInitAlloc_8u_C4R(int roiWidth, const Zel8u* mask,
+                                                   ZeliSize maskSize, ZeliPoint anchor,
+                                                   ZeliMorphState** stateOut);
+ZELCV_API ZelStatus zeliMorphologyGetSize_32f_C1R(int roiWidth, const Zel8u* mask,
+                                                  ZeliSize maskSize, int* stateSize);
+ZELCV_API ZelStatus zeliMorphologyInit_32f_C1R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                               ZeliPoint anchor, ZeliMorphState* state);
+ZELCV_API ZelStatus zeliMorphologyInitAlloc_32f_C1R(int roiWidth, const Zel8u* mask,
+                                                    ZeliSize maskSize, ZeliPoint anchor,
+                                                    ZeliMorphState** stateOut);
+ZELCV_API ZelStatus zeliMorphologyGetSize_32f_C3R(int roiWidth, const Zel8u* mask,
+                                                  ZeliSize maskSize, int* stateSize);
+ZELCV_API ZelStatus zeliMorphologyInit_32f_C3R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                               ZeliPoint anchor, ZeliMorphState* state);
+ZELCV_API ZelStatus zeliMorphologyInitAlloc_32f_C3R(int roiWidth, const Zel8u* mask,
+                                                    ZeliSize maskSize, ZeliPoint anchor,
+                                                    ZeliMorphState** stateOut);
+ZELCV_API ZelStatus zeliMorphologyGetSize_32f_C4R(int roiWidth, const Zel8u* mask,
+                                                  ZeliSize maskSize, int* stateSize);
+ZELCV_API ZelStatus zeliMorphologyInit_32f_C4R(int roiWidth, const Zel8u* mask, ZeliSize maskSize,
+                                               ZeliPoint anchor, ZeliMorphState* state);
+ZELCV_API ZelStatus zeliMorphologyInitAlloc_32f_C4R(int roiWidth, const Zel8u* mask,
+                                                    ZeliSize maskSize, ZeliPoint anchor,
+                                                    ZeliMorphState** stateOut);
+ZELCV_API ZelStatus zeliDilateBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                     int dstStep, ZeliSize roiSize,
+                                                     ZeliBorderType borderType,
+                                                     ZeliMorphState* state);
+ZELCV_API ZelStatus zeliDilateBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                     int dstStep, ZeliSize roiSize,
+                                                     ZeliBorderType borderType,
+                                                     ZeliMorphState* state);
+ZELCV_API ZelStatus zeliDilateBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                     int dstStep, ZeliSize roiSize,
+                                                     ZeliBorderType borderType,
+                                                     ZeliMorphState* state);
+ZELCV_API ZelStatus zeliDilateBorderReplicate_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                                      int dstStep, ZeliSize roiSize,
+                                                      ZeliBorderType borderType,
+                                                      ZeliMorphState* state);
+ZELCV_API ZelStatus zeliDilateBorderReplicate_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                                      int dstStep, ZeliSize roiSize,
+                                                      ZeliBorderType borderType,
+                                                      ZeliMorphState* state);
+ZELCV_API ZelStatus zeliDilateBorderReplicate_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                                      int dstStep, ZeliSize roiSize,
+                                                      ZeliBorderType borderType,
+                                                      ZeliMorphState* state);
+ZELCV_API ZelStatus zeliErodeBorderReplicate_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                    int dstStep, ZeliSize roiSize,
+                                                    ZeliBorderType borderType,
+                                                    ZeliMorphState* state);
+ZELCV_API ZelStatus zeliErodeBorderReplicate_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                    int dstStep, ZeliSize roiSize,
+                                                    ZeliBorderType borderType,
+                                                    ZeliMorphState* state);
+ZELCV_API ZelStatus zeliErodeBorderReplicate_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst,
+                                                    int dstStep, ZeliSize roiSize,
+                                                    ZeliBorderType borderType,
+                                                    ZeliMorphState* state);
+ZELCV_API ZelStatus zeliErodeBorderReplicate_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                                     int dstStep, ZeliSize roiSize,
+                                                     ZeliBorderType borderType,
+                                                     ZeliMorphState* state);
+ZELCV_API ZelStatus zeliErodeBorderReplicate_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                                     int dstStep, ZeliSize roiSize,
+                                                     ZeliBorderType borderType,
+                                                     ZeliMorphState* state);
+ZELCV_API ZelStatus zeliErodeBorderReplicate_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                                     int dstStep, ZeliSize roiSize,
+                                                     ZeliBorderType borderType,
+                                                     ZeliMorphState* state);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_8u_C1R(int roiWidth, ZeliSize maskSize,
+                                                       int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_8u_C1R(int roiWidth, const Zel8u* mask,
+                                                    ZeliSize maskSize, ZeliMorphState* state,
+                                                    Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_8u_C3R(int roiWidth, ZeliSize maskSize,
+                                                       int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_8u_C3R(int roiWidth, const Zel8u* mask,
+                                                    ZeliSize maskSize, ZeliMorphState* state,
+                                                    Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_8u_C4R(int roiWidth, ZeliSize maskSize,
+                                                       int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_8u_C4R(int roiWidth, const Zel8u* mask,
+                                                    ZeliSize maskSize, ZeliMorphState* state,
+                                                    Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_32f_C1R(int roiWidth, ZeliSize maskSize,
+                                                        int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_32f_C1R(int roiWidth, const Zel8u* mask,
+                                                     ZeliSize maskSize, ZeliMorphState* state,
+                                                     Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_32f_C3R(int roiWidth, ZeliSize maskSize,
+                                                        int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_32f_C3R(int roiWidth, const Zel8u* mask,
+                                                     ZeliSize maskSize, ZeliMorphState* state,
+                                                     Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_32f_C4R(int roiWidth, ZeliSize maskSize,
+                                                        int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_32f_C4R(int roiWidth, const Zel8u* mask,
+                                                     ZeliSize maskSize, ZeliMorphState* state,
+                                                     Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_16u_C1R(int roiWidth, ZeliSize maskSize,
+                                                        int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_16u_C1R(int roiWidth, const Zel8u* mask,
+                                                     ZeliSize maskSize, ZeliMorphState* state,
+                                                     Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_16s_C1R(int roiWidth, ZeliSize maskSize,
+                                                        int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_16s_C1R(int roiWidth, const Zel8u* mask,
+                                                     ZeliSize maskSize, ZeliMorphState* state,
+                                                     Zel8u* buffer);
+ZELCV_API ZelStatus zeliMorphologyBorderGetSize_1u_C1R(int roiWidth, ZeliSize maskSize,
+                                                       int* stateSize, int* bufferSize);
+ZELCV_API ZelStatus zeliMorphologyBorderInit_1u_C1R(int roiWidth, const Zel8u* mask,
+                                                    ZeliSize maskSize, ZeliMorphState* state,
+                                                    Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
+                                            ZeliSize roiSize, ZeliBorderType borderType,
+                                            Zel8u borderValue, const ZeliMorphState* state,
+                                            Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
+                                            ZeliSize roiSize, ZeliBorderType borderType,
+                                            const Zel8u borderValue[3], const ZeliMorphState* state,
+                                            Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
+                                            ZeliSize roiSize, ZeliBorderType borderType,
+                                            const Zel8u borderValue[4], const ZeliMorphState* state,
+                                            Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                             int dstStep, ZeliSize roiSize,
+                                             ZeliBorderType borderType, Zel32f borderValue,
+                                             const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                             int dstStep, ZeliSize roiSize,
+                                             ZeliBorderType borderType, const Zel32f borderValue[3],
+                                             const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                             int dstStep, ZeliSize roiSize,
+                                             ZeliBorderType borderType, const Zel32f borderValue[4],
+                                             const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_16u_C1R(const Zel16u* src, int srcStep, Zel16u* dst,
+                                             int dstStep, ZeliSize roiSize,
+                                             ZeliBorderType borderType, Zel16u borderValue,
+                                             const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_16s_C1R(const Zel16s* src, int srcStep, Zel16s* dst,
+                                             int dstStep, ZeliSize roiSize,
+                                             ZeliBorderType borderType, Zel16s borderValue,
+                                             const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliDilateBorder_1u_C1R(const Zel8u* src, int srcStep, int srcBitOffset,
+                                            Zel8u* dst, int dstStep, int dstBitOffset,
+                                            ZeliSize roiSize, ZeliBorderType borderType,
+                                            Zel8u borderValue, const ZeliMorphState* state,
+                                            Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
+                                           ZeliSize roiSize, ZeliBorderType borderType,
+                                           Zel8u borderValue, const ZeliMorphState* state,
+                                           Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
+                                           ZeliSize roiSize, ZeliBorderType borderType,
+                                           const Zel8u borderValue[3], const ZeliMorphState* state,
+                                           Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_8u_C4R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
+                                           ZeliSize roiSize, ZeliBorderType borderType,
+                                           const Zel8u borderValue[4], const ZeliMorphState* state,
+                                           Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                            int dstStep, ZeliSize roiSize,
+                                            ZeliBorderType borderType, Zel32f borderValue,
+                                            const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                            int dstStep, ZeliSize roiSize,
+                                            ZeliBorderType borderType, const Zel32f borderValue[3],
+                                            const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_32f_C4R(const Zel32f* src, int srcStep, Zel32f* dst,
+                                            int dstStep, ZeliSize roiSize,
+                                            ZeliBorderType borderType, const Zel32f borderValue[4],
+                                            const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_16u_C1R(const Zel16u* src, int srcStep, Zel16u* dst,
+                                            int dstStep, ZeliSize roiSize,
+                                            ZeliBorderType borderType, Zel16u borderValue,
+                                            const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_16s_C1R(const Zel16s* src, int srcStep, Zel16s* dst,
+                                            int dstStep, ZeliSize roiSize,
+                                            ZeliBorderType borderType, Zel16s borderValue,
+                                            const ZeliMorphState* state, Zel8u* buffer);
+ZELCV_API ZelStatus zeliErodeBorder_1u_C1R(const Zel8u* src, int srcStep, int srcBitOffset,
+                                           Zel8u* dst, int dstStep, int dstBitOffset,
+                                           ZeliSize roiSize, ZeliBorderType borderType,
+                                           Zel8u borderValue, const ZeliMorphState* state,
+                                           Zel8u* buffer);
 
 /* ---- Integral images and rectangle statistics -------------------------- */
+/* Integral images. For a w x h ROI the plain integral is (w + 1) x (h + 1):
+ * row 0 and column 0 hold the start value val, and element (x + 1, y + 1)
+ * holds val plus the sum of the source pixels in rows 0..y, columns 0..x.
+ * SqrIntegral adds a second image of the same shape holding valSqr plus the
+ * sum of the squared pixels. Each row is built from a running sum of the
+ * source row (a 32-bit unsigned integer for 8u sources, converted once to the
+ * output's floating type; single precision for 32f sources) added to the row
+ * above. 32s outputs wrap modulo 2^32; they are never saturated.
+ * Checks: null src, dst (or sqr) -8; w or h < 1 -6; srcStep < w x source
+ * element size, dstStep (sqrStep) < (w + 1) x output element size -14; a
+ * step of a 32- or 64-bit image not a multiple of its element size -108
+ * (8u source steps are never tested for alignment). The tilted members check
+ * the same way with w + 2 output columns. */
+ZELCV_API ZelStatus zeliIntegral_8u32s_C1R(const Zel8u* src, int srcStep, Zel32s* dst, int dstStep,
+                                           ZeliSize roiSize, Zel32s val);
+ZELCV_API ZelStatus zeliIntegral_8u32f_C1R(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep,
+                                           ZeliSize roiSize, Zel32f val);
+/* No start value: row 0 and column 0 are 0. */
+ZELCV_API ZelStatus zeliIntegral_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep,
+                                         ZeliSize roiSize);
+ZELCV_API ZelStatus zeliSqrIntegral_8u32s_C1R(const Zel8u* src, int srcStep, Zel32s* dst, int dstStep,
+                                              Zel32s* sqr, int sqrStep, ZeliSize roiSize, Zel32s val,
+                                              Zel32s valSqr);
+ZELCV_API ZelStatus zeliSqrIntegral_8u32s64f_C1R(const Zel8u* src, int srcStep, Zel32s* dst,
+                                                 int dstStep, Zel64f* sqr, int sqrStep,
+                                                 ZeliSize roiSize, Zel32s val, Zel64f valSqr);
+ZELCV_API ZelStatus zeliSqrIntegral_8u32f64f_C1R(const Zel8u* src, int srcStep, Zel32f* dst,
+                                                 int dstStep, Zel64f* sqr, int sqrStep,
+                                                 ZeliSize roiSize, Zel32f val, Zel64f valSqr);
+
+/* Tilted (45-degree) integrals: (w + 2) x (h + 2) outputs T, rows 0 and 1
+ * holding val. For n >= 2, T[n][x] is val plus the sum of the source pixels
+ * (r, c) with r <= n - 2 whose column lies in the upward cone
+ * L = x - 1 - (n - 2 - r) <= c <= R = x + (n - 2 - r); the first column
+ * (c = 0) is counted only when L <= 0 and L is even, the column just right of
+ * the ROI (c = w) only when R >= w and R - w is even, other columns inside
+ * the cone always. Each row n is built from rows n - 1 and n - 2:
+ * T[n][x] = T[n-1][x-1] - T[n-2][x] + T[n-1][x+1] + src[n-2][x-1] + src[n-2][x],
+ * T[n][0] = T[n-1][1], T[n][w+1] = T[n-1][w]. Floating sums are evaluated
+ * left to right in double precision and rounded once to the output type.
+ *
+ * zeliTiltedIntegral_8u32f_C1R: the last column (x = w) of rows 2..h+1 adds
+ * the value that the destination already held there (as if that value were
+ * the pixel just right of the ROI); clear the destination first for a clean
+ * result. zeliTiltedIntegral_8u32s_C1R never reads the destination nor
+ * anything right of the ROI: its column w counts no pixel c = w. */
+ZELCV_API ZelStatus zeliTiltedIntegral_8u32f_C1R(const Zel8u* src, int srcStep, Zel32f* dst,
+                                                 int dstStep, ZeliSize roiSize, Zel32f val);
+ZELCV_API ZelStatus zeliTiltedIntegral_8u32s_C1R(const Zel8u* src, int srcStep, Zel32s* dst,
+                                                 int dstStep, ZeliSize roiSize, Zel32s val);
+/* Tilted sums and tilted squares, both (w + 2) x (h + 2). These read the
+ * source pixel just right of the ROI in every row (src[y][w], counted as the
+ * column c = w above): the caller must make it readable. The 32s planes wrap
+ * modulo 2^32; 32f and 64f planes are evaluated in double precision
+ * (T[n-1][x-1] - T[n-2][x] + T[n-1][x+1] + a + b, left to right, with a and b
+ * the two pixels or their squares) and rounded once. Checks: null src, dst or
+ * sqr -8; w or h < 1 -6; srcStep < w, dstStep < (w + 2) x element size of the
+ * sums, sqrStep < (w + 2) x element size of the squares -14; a 32-bit step
+ * not a multiple of 4 or a 64-bit step not a multiple of 8 -108. */
+ZELCV_API ZelStatus zeliTiltedSqrIntegral_8u32s_C1R(const Zel8u* src, int srcStep, Zel32s* dst,
+                                                    int dstStep, Zel32s* sqr, int sqrStep,
+                                                    ZeliSize roiSize, Zel32s val, Zel32s valSqr);
+ZELCV_API ZelStatus zeliTiltedSqrIntegral_8u32s64f_C1R(const Zel8u* src, int srcStep, Zel32s* dst,
+                                                       int dstStep, Zel64f* sqr, int sqrStep,
+                                                       ZeliSize roiSize, Zel32s val,
+                                                       Zel64f valSqr);
+ZELCV_API ZelStatus zeliTiltedSqrIntegral_8u32f64f_C1R(const Zel8u* src, int srcStep, Zel32f* dst,
+                                                       int dstStep, Zel64f* sqr, int sqrStep,
+                                                       ZeliSize roiSize, Zel32f val,
+                                                       Zel64f valSqr);
+
+/* Standard deviation over a sliding rectangle, from an integral (src) and a
+ * squared integral (sqr). For each output pixel (x, y) of roiSize the
+ * rectangle's corners in the integrals are TL = (x + rect.x, y + rect.y),
+ * TR = TL + (rect.width, 0), BL = TL + (0, rect.height) and
+ * BR = TL + (rect.width, rect.height); S = (I[TL] - I[TR]) + (I[BR] - I[BL])
+ * and Q the same over the squares; with n the rectangle's pixel count,
+ * mean = S / n and the result is sqrt(Q / n - mean^2), a negative variance
+ * counting as 0. The integrals need w + rect.x + rect.width columns and
+ * h + rect.y + rect.height rows.
+ *   32f: S in single precision, Q in double; inv = 1 / n in double with n
+ *   first converted to single precision; mean = S x inv and
+ *   Q x inv - mean^2 in double, rounded to single precision; single square
+ *   root.
+ *   32s32f: as 32f, with S the exact 32-bit difference (wrapping, so that
+ *   wrapped integrals still give the right sum) converted to double.
+ *   32s_C1RSfs: both integrals 32s (as zeliSqrIntegral_8u32s_C1R makes them);
+ *   S a signed and Q an unsigned 32-bit wrapping difference; the variance is
+ *   (n x Q - S^2) / n^2 in double precision (so a constant area gives exactly
+ *   0 while n x Q stays below 2^53); the double square root is multiplied by
+ *   2^-scaleFactor, rounded to nearest (ties to even) and saturated to
+ *   Zel32s. Any scaleFactor is accepted.
+ * Checks, in this order: null src, sqr or dst -8; w or h < 1 -6;
+ * srcStep < (w + rect.x + rect.width) x element size, dstStep < w x element
+ * size or sqrStep < (w + rect.x + rect.width) x element size -14; a step not
+ * a multiple of its element size -108; then rect.x < 0, rect.y < 0,
+ * rect.width < 1 or rect.height < 1 -6 (the rectangle after the steps). */
+ZELCV_API ZelStatus zeliRectStdDev_32f_C1R(const Zel32f* src, int srcStep, const Zel64f* sqr,
+                                           int sqrStep, Zel32f* dst, int dstStep,
+                                           ZeliSize roiSize, ZeliRect rect);
+ZELCV_API ZelStatus zeliRectStdDev_32s32f_C1R(const Zel32s* src, int srcStep, const Zel64f* sqr,
+                                              int sqrStep, Zel32f* dst, int dstStep,
+                                              ZeliSize roiSize, ZeliRect rect);
+ZELCV_API ZelStatus zeliRectStdDev_32s_C1RSfs(const Zel32s* src, int srcStep, const Zel32s* sqr,
+                                              int sqrStep, Zel32s* dst, int dstStep,
+                                              ZeliSize roiSize, ZeliRect rect, int scaleFactor);
+/* The same over a tilted rectangle, from tilted integrals. (rect.x, rect.y)
+ * is the rectangle's top corner in the integrals; rect.width runs down to the
+ * right and rect.height down to the left, so the corners are
+ * top = (x + rect.x, y + rect.y), right = top + (rect.width, rect.width),
+ * left = top + (-rect.height, rect.height) and
+ * bottom = top + (rect.width - rect.height, rect.width + rect.height), and
+ * S = (T[top] - T[right]) + (T[bottom] - T[left]). In source pixels the
+ * rectangle's top row is row y + rect.y, columns x + rect.x - 1 and
+ * x + rect.x; with (tx, ty) = (x + rect.x, y + rect.y) it holds the pixels
+ * (row r, column c) with tx - ty - 2 rect.height + 1 <= c - r <= tx - ty and
+ * tx + ty - 1 <= c + r <= tx + ty + 2 rect.width - 2, n = 2 x rect.width x
+ * rect.height pixels in rows ty .. ty + rect.width + rect.height - 2.
+ * Arithmetic, argument kinds and checks
+ * as the upright members, plus rect.x < rect.height -6 (the left corner would
+ * lie left of column 0). The integrals need w + rect.x + rect.width columns
+ * and h + rect.y + rect.width + rect.height rows. */
+ZELCV_API ZelStatus zeliTiltedRectStdDev_32f_C1R(const Zel32f* src, int srcStep, const Zel64f* sqr,
+                                                 int sqrStep, Zel32f* dst, int dstStep,
+                                                 ZeliSize roiSize, ZeliRect rect);
+ZELCV_API ZelStatus zeliTiltedRectStdDev_32s32f_C1R(const Zel32s* src, int srcStep,
+                                                    const Zel64f* sqr, int sqrStep, Zel32f* dst,
+                                                    int dstStep, ZeliSize roiSize, ZeliRect rect);
+ZELCV_API ZelStatus zeliTiltedRectStdDev_32s_C1RSfs(const Zel32s* src, int srcStep,
+                                                    const Zel32s* sqr, int sqrStep, Zel32s* dst,
+                                                    int dstStep, ZeliSize roiSize, ZeliRect rect,
+                                                    int scaleFactor);
 
 #ifdef __cplusplus
 }
