@@ -210,9 +210,10 @@ void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
   }
 }
 
-// Any element and any border: the maximum over every on element, reading
-// rows beyond the ROI from memory on flagged sides and replicating the edge
-// elsewhere. In place, the ROI rows still needed are kept in a ring.
+// Any element and any border, in place: the maximum over every on element,
+// one element at a time, reading rows beyond the ROI from memory on flagged
+// sides and replicating the edge elsewhere; the ROI rows still needed are
+// kept in a ring.
 template <typename T, typename Op>
 void generalCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, ZeliBorderType border,
                  const View& v, uint8_t* work) {
@@ -253,6 +254,72 @@ void generalCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, i
   }
 }
 
+// Not in place: every output row in one pass over the on elements, reading
+// the source rows in place (eight elements at a time); only the columns
+// whose elements reach past a replicated side are done element by element.
+template <typename T, typename Op>
+void pointsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, ZeliBorderType border,
+                const View& v) {
+  const int mw = v.maskWidth, mh = v.maskHeight, ax = v.anchorX, ay = v.anchorY;
+  const bool top = inMemoryTop(border), bottom = inMemoryBottom(border);
+  const bool left = inMemoryLeft(border), right = inMemoryRight(border);
+  int reachLeft = 0, reachRight = 0;
+  for (int j = 0; j < mh; ++j)
+    for (int i = 0; i < mw; ++i)
+      if (v.mask[int64_t(j) * mw + i]) {
+        reachLeft = std::max(reachLeft, ax - i);
+        reachRight = std::max(reachRight, i - ax);
+      }
+  const int xl = left ? 0 : std::min(W, reachLeft);
+  const int xr = std::max(xl, right ? W : W - reachRight);
+  auto srcRow = [&](int r) {
+    return rowAt(src, srcStep, (r < 0 && top) || (r >= H && bottom) ? r : clampInt(r, 0, H - 1));
+  };
+  constexpr int kChunk = 8;
+  const T* rows[kChunk];
+  for (int y = 0; y < H; ++y) {
+    T* out = rowAt(dst, dstStep, y);
+    int count = 0;
+    bool first = true;
+    auto flush = [&]() {
+      using Table = minmax::CountTableTo<minmax::CombineRows, T, Op, kChunk>;
+      Table::kernel[count](out + xl * c, rows, (xr - xl) * c);
+      first = false;
+      count = 0;
+      rows[count++] = out + xl * c;  // later chunks combine with what is there
+    };
+    for (int j = 0; j < mh; ++j) {
+      const T* row = srcRow(y + j - ay);
+      for (int i = 0; i < mw; ++i) {
+        if (!v.mask[int64_t(j) * mw + i]) continue;
+        rows[count++] = row + (xl + i - ax) * c;
+        if (count == kChunk) flush();
+      }
+    }
+    if (first || count > 1) flush();
+    // Columns whose elements reach past a replicated side.
+    for (int x = 0; x < W; x = (x + 1 == xl) ? std::max(xl, xr) : x + 1) {
+      if (x >= xl && x < xr) continue;
+      for (int ch = 0; ch < c; ++ch) {
+        bool any = false;
+        T best = T();
+        for (int j = 0; j < mh; ++j) {
+          const T* row = srcRow(y + j - ay);
+          for (int i = 0; i < mw; ++i) {
+            if (!v.mask[int64_t(j) * mw + i]) continue;
+            int px = x + i - ax;
+            if ((px < 0 && !left) || (px >= W && !right)) px = clampInt(px, 0, W - 1);
+            const T value = row[px * c + ch];
+            best = any ? Op::s(best, value) : value;
+            any = true;
+          }
+        }
+        out[x * c + ch] = best;
+      }
+    }
+  }
+}
+
 template <typename T>
 void copyRows(const T* src, int srcStep, T* dst, int dstStep, int H, size_t rowBytes) {
   if (src == dst) return;
@@ -272,8 +339,10 @@ void applyWith(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int
                     v.shape.rectOffsetX, v.shape.rectOffsetY, work);
   else if (v.kind == kRuns && !flags)
     runsCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, v, work);
-  else
+  else if (overlaps(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(W) * c))
     generalCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, border, v, work);
+  else
+    pointsCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, border, v);
 }
 
 int bitAt(const uint8_t* row, int64_t position) {
