@@ -195,6 +195,18 @@ void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
   int o[N];
   for (int k = 0; k < N; ++k) o[k] = offsets[k];
   int i = 0;
+  // Two vectors per step; both are loaded before either is stored, which
+  // keeps the in-place use with forward offsets valid.
+  for (; i + 2 * V::kLanes <= n; i += 2 * V::kLanes) {
+    auto m = V::loadu(src + i + o[0]);
+    auto m2 = V::loadu(src + i + V::kLanes + o[0]);
+    for (int k = 1; k < N; ++k) {
+      m = Op::v(m, V::loadu(src + i + o[k]));
+      m2 = Op::v(m2, V::loadu(src + i + V::kLanes + o[k]));
+    }
+    V::storeu(out + i, m);
+    V::storeu(out + i + V::kLanes, m2);
+  }
   for (; i + V::kLanes <= n; i += V::kLanes) {
     auto m = V::loadu(src + i + o[0]);
     for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(src + i + o[k]));
