@@ -26,5 +26,6 @@ int demoCheck(const char* what, ZelStatus status);
 int demoCanny(const DemoImage* image, const char* outDir);
 int demoIntegral(const DemoImage* image, const char* outDir);
 int demoMorph(const DemoImage* image, const char* outDir);
+int demoMorphAdv(const DemoImage* image, const char* outDir);
 
 #endif

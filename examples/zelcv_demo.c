@@ -30,6 +30,7 @@ int main(int argc, char** argv) {
   failures |= demoCanny(&image, outDir);
   failures |= demoIntegral(&image, outDir);
   failures |= demoMorph(&image, outDir);
+  failures |= demoMorphAdv(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }
