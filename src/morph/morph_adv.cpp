@@ -11,6 +11,7 @@
 #include "core/status.h"
 #include "filter/border.h"
 #include "kernels/morphadv.h"
+#include "morph/morph_checks.h"
 #include "morph/morph_core.h"
 #include "morph/morph_state.h"
 
@@ -275,9 +276,7 @@ ZelStatus morphAdv(Op op, const T* src, int srcStep, T* dst, int dstStep, ZeliSi
                    const ZeliMorphAdvState* state, Zel8u* buffer) {
   if (ZelStatus s = checkPointers({src, dst, state, buffer})) return s;
   if (ZelStatus s = checkSize(roi)) return s;
-  const int64_t rowBytes = int64_t(roi.width) * C * int64_t(sizeof(T));
-  if (srcStep < rowBytes || dstStep < rowBytes) return zelStatusBadStep;
-  if (sizeof(T) == 2 && ((srcStep | dstStep) & 1)) return zelStatusMisalignedStep;
+  if (ZelStatus s = checkMorphSteps<T, C>(srcStep, dstStep, roi.width)) return s;
   const AdvHeader h = header(state);
   if (ZelStatus s = checkRest<Typed<T, C>>(op, src, dst, roi.width, border, h)) return s;
   const View v = readState(h.first);
@@ -293,9 +292,7 @@ ZelStatus morphAdvBits(Op op, const Zel8u* src, int srcStep, int srcBitOffset, Z
                        Zel8u* buffer) {
   if (ZelStatus s = checkPointers({src, dst, state, buffer})) return s;
   if (ZelStatus s = checkSize(roi)) return s;
-  if (srcBitOffset < 0 || dstBitOffset < 0) return zelStatusBadSize;
-  const int64_t rowBytes = (int64_t(roi.width) + 7) / 8;
-  if (srcStep < rowBytes || dstStep < rowBytes) return zelStatusBadStep;
+  if (ZelStatus s = checkBitSteps(srcStep, srcBitOffset, dstStep, dstBitOffset, roi.width)) return s;
   const AdvHeader h = header(state);
   if (ZelStatus s = checkRest<Bits>(op, src, dst, roi.width, border, h)) return s;
   const Plane s = Bits::shifted({const_cast<Zel8u*>(src), srcStep, 0}, srcBitOffset, 0);

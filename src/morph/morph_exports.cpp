@@ -4,6 +4,7 @@
 
 #include "core/status.h"
 #include "filter/border.h"
+#include "morph/morph_checks.h"
 #include "morph/morph_core.h"
 #include "morph/morph_state.h"
 
@@ -56,16 +57,6 @@ ZelStatus filterBufferQuery(int dataType, int channels, int roiWidth, ZeliSize m
   return storeSize(filterBufferSize(dataType, channels, roiWidth, maskSize.height), bufferSize);
 }
 
-// Steps of the dilation/erosion calls: row bytes, then for 16-bit data odd
-// steps. 32-bit float steps are compared with the row bytes only.
-template <typename T, int C>
-ZelStatus checkMorphSteps(int srcStep, int dstStep, int width) {
-  const int64_t rowBytes = int64_t(width) * C * int64_t(sizeof(T));
-  if (srcStep < rowBytes || dstStep < rowBytes) return zelStatusBadStep;
-  if (sizeof(T) == 2 && ((srcStep | dstStep) & 1)) return zelStatusMisalignedStep;
-  return zelStatusOk;
-}
-
 ZelStatus checkStateFor(const View& v, int width, int dataType, int channels) {
   if (width > v.maxRoiWidth) return zelStatusBadSize;
   if (v.dataType != dataType) return zelStatusBadDataType;
@@ -107,9 +98,7 @@ ZelStatus morphBits(bool dilate, const Zel8u* src, int srcStep, int srcBitOffset
                     Zel8u* buffer) {
   if (ZelStatus s = checkPointers({src, dst, state, buffer})) return s;
   if (ZelStatus s = checkSize(roi)) return s;
-  if (srcBitOffset < 0 || dstBitOffset < 0) return zelStatusBadSize;
-  const int64_t rowBytes = (int64_t(roi.width) + 7) / 8;
-  if (srcStep < rowBytes || dstStep < rowBytes) return zelStatusBadStep;
+  if (ZelStatus s = checkBitSteps(srcStep, srcBitOffset, dstStep, dstBitOffset, roi.width)) return s;
   const int kind = borderKind(border);
   if (kind != zelBorderReplicate && kind != zelBorderInMemory) return zelStatusBadBorder;
   const View v = readBitState(state);

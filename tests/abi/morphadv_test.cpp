@@ -251,17 +251,30 @@ TYPED_TEST(MorphAdvTyped, EveryOperationMatchesTheReference) {
   for (const auto& api : apis<TypeParam>()) checkAgainstReference(api, rng, 100);
 }
 
+// A caller-memory state and its buffer from GetSize and Init.
+struct Built {
+  std::vector<uint8_t> block, buffer;
+  ZeliMorphAdvState* state() { return reinterpret_cast<ZeliMorphAdvState*>(block.data()); }
+  template <typename T>
+  bool init(const Api<T>& api, ZeliSize roi, std::vector<Zel8u>& mask, ZeliSize maskSize) {
+    int stateSize = 0, bufferSize = 0;
+    if (api.getSize(roi, maskSize, &stateSize, &bufferSize) != zelStatusOk) return false;
+    block.assign(static_cast<size_t>(stateSize), 0);
+    buffer.assign(static_cast<size_t>(bufferSize), 0);
+    return api.init(roi, mask.data(), maskSize, state(), buffer.data()) == zelStatusOk;
+  }
+};
+
 // A mask of zeros: opening and closing copy, the differences are zero.
 TYPED_TEST(MorphAdvTyped, EmptyMaskCopiesAndZeroes) {
   std::mt19937 rng(77);
   for (const auto& api : apis<TypeParam>()) {
     std::vector<Zel8u> mask(12, 0);
     const ZeliSize roi = {9, 5}, maskSize = {4, 3};
-    int stateSize, bufferSize;
-    ASSERT_EQ(api.getSize(roi, maskSize, &stateSize, &bufferSize), zelStatusOk);
-    std::vector<uint8_t> state(static_cast<size_t>(stateSize)), buffer(static_cast<size_t>(bufferSize));
-    auto* s = reinterpret_cast<ZeliMorphAdvState*>(state.data());
-    ASSERT_EQ(api.init(roi, mask.data(), maskSize, s, buffer.data()), zelStatusOk);
+    Built built;
+    ASSERT_TRUE(built.init(api, roi, mask, maskSize));
+    ZeliMorphAdvState* s = built.state();
+    std::vector<uint8_t>& buffer = built.buffer;
     zeltest::Layout l;
     l.width = roi.width;
     l.height = roi.height;
@@ -284,11 +297,10 @@ TYPED_TEST(MorphAdvTyped, ChecksInOrderWriteNothing) {
     const int C = api.channels, e = int(sizeof(TypeParam));
     std::vector<Zel8u> mask = {1, 0, 1, 1, 1, 0};
     const ZeliSize roi = {8, 4}, maskSize = {3, 2};
-    int stateSize, bufferSize;
-    ASSERT_EQ(api.getSize(roi, maskSize, &stateSize, &bufferSize), zelStatusOk);
-    std::vector<uint8_t> state(static_cast<size_t>(stateSize)), buffer(static_cast<size_t>(bufferSize));
-    auto* s = reinterpret_cast<ZeliMorphAdvState*>(state.data());
-    ASSERT_EQ(api.init(roi, mask.data(), maskSize, s, buffer.data()), zelStatusOk);
+    Built built;
+    ASSERT_TRUE(built.init(api, roi, mask, maskSize));
+    ZeliMorphAdvState* s = built.state();
+    std::vector<uint8_t>& buffer = built.buffer;
     zeltest::Layout l;
     l.width = 12;
     l.height = 12;
