@@ -508,7 +508,10 @@ ZELCV_API ZelStatus zeliErodeBorder_1u_C1R(const Zel8u* src, int srcStep, int sr
  * mask (the reflected anchor for the reflection); its state is released by
  * MorphAdvFree. Processing calls accept zelBorderReplicate with any in-memory
  * side flags or zelBorderInMemory (which reads mh - 1 rows and mw - 1 columns
- * around the ROI); borderValue is never read. src and dst must not overlap.
+ * around the ROI); borderValue is never read. An ROI wider than the Init
+ * width, or one whose intermediate image does not fit the Init size, gives
+ * -6. Opening and closing accept src == dst; top-hat, black-hat and gradient
+ * refuse it (-9997); other overlaps are not supported.
  * Top-hat is src - opening, black-hat closing - src, gradient dilation -
  * erosion: saturating at 0 for 8u and 16u, to the 16-bit range for 16s, and
  * for 32f a float subtraction clamped below at 0 (NaN gives 0). 1u: pixels as
