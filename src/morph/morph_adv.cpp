@@ -216,6 +216,7 @@ ZelStatus openClose(bool closing, Plane src, Plane dst, ZeliSize roi, ZeliBorder
   const View v1 = F::view(h.first), v2 = F::view(h.second);
   int flags = border & 0xF0;
   if (borderKind(border) == zelBorderInMemory) flags = 0xF0;
+  if (v2.kind == kEmpty) flags = 0;  // both passes copy: nothing around the ROI is needed
   const int left = (flags & zelBorderInMemLeft) ? v2.anchorX : 0;
   const int right = (flags & zelBorderInMemRight) ? v2.maskWidth - 1 - v2.anchorX : 0;
   const int top = (flags & zelBorderInMemTop) ? v2.anchorY : 0;

@@ -183,7 +183,7 @@ struct StateHolder {
 template <typename T>
 void checkAgainstReference(const Api<T>& api, std::mt19937& rng, int rounds) {
   const int C = api.channels;
-  const int stepMultiple = sizeof(T) == 2 ? 2 : 1;
+  const int stepMultiple = int(sizeof(T));
   for (int round = 0; round < rounds; ++round) {
     const int mw = pick(rng, 1, 6), mh = pick(rng, 1, 6);
     Mask mask = morphtest::makeMask(rng, morphtest::randomShape(rng), mw, mh);
