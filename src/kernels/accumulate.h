@@ -1,0 +1,204 @@
+// Kernels that update a 32f accumulator from one or two sources: a formula
+// (one scalar and one vector form, the same single-precision operations in
+// the same order) applied per pixel, optionally under an 8u mask.
+#ifndef ZELCV_KERNELS_ACCUMULATE_H
+#define ZELCV_KERNELS_ACCUMULATE_H
+
+#include <stdint.h>
+#include <string.h>
+
+#include "kernels/row_driver.h"
+#include "kernels/simd.h"
+
+namespace zelcv {
+namespace accumulate {
+
+// Exact conversion of source elements to single precision: one element, four
+// (a vector part) or sixteen (a block, as four vectors).
+template <typename T> struct ToFloat;
+
+template <> struct ToFloat<uint8_t> {
+  static __m128i widen16(__m128i v) { return _mm_unpacklo_epi8(v, _mm_setzero_si128()); }
+  static __m128 lo(__m128i v16) { return _mm_cvtepi32_ps(_mm_unpacklo_epi16(v16, _mm_setzero_si128())); }
+  static __m128 hi(__m128i v16) { return _mm_cvtepi32_ps(_mm_unpackhi_epi16(v16, _mm_setzero_si128())); }
+  static void block(const uint8_t* p, __m128 out[4]) {
+    __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    __m128i l = _mm_unpacklo_epi8(v, _mm_setzero_si128());
+    __m128i h = _mm_unpackhi_epi8(v, _mm_setzero_si128());
+    out[0] = lo(l);
+    out[1] = hi(l);
+    out[2] = lo(h);
+    out[3] = hi(h);
+  }
+  static __m128 part(const uint8_t* p) {
+    int32_t bits;
+    memcpy(&bits, p, 4);
+    return lo(widen16(_mm_cvtsi32_si128(bits)));
+  }
+};
+
+template <> struct ToFloat<int8_t> {
+  // Sign extension: the byte lands in the high half of a 16-bit lane, then
+  // an arithmetic shift brings it down (likewise 16 to 32 bits).
+  static __m128i lo16(__m128i v) { return _mm_srai_epi16(_mm_unpacklo_epi8(v, v), 8); }
+  static __m128i hi16(__m128i v) { return _mm_srai_epi16(_mm_unpackhi_epi8(v, v), 8); }
+  static __m128 lo(__m128i v16) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(v16, v16), 16)); }
+  static __m128 hi(__m128i v16) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpackhi_epi16(v16, v16), 16)); }
+  static void block(const int8_t* p, __m128 out[4]) {
+    __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    __m128i l = lo16(v), h = hi16(v);
+    out[0] = lo(l);
+    out[1] = hi(l);
+    out[2] = lo(h);
+    out[3] = hi(h);
+  }
+  static __m128 part(const int8_t* p) {
+    int32_t bits;
+    memcpy(&bits, p, 4);
+    return lo(lo16(_mm_cvtsi32_si128(bits)));
+  }
+};
+
+template <> struct ToFloat<uint16_t> {
+  static __m128 lo(__m128i v) { return _mm_cvtepi32_ps(_mm_unpacklo_epi16(v, _mm_setzero_si128())); }
+  static __m128 hi(__m128i v) { return _mm_cvtepi32_ps(_mm_unpackhi_epi16(v, _mm_setzero_si128())); }
+  static void block(const uint16_t* p, __m128 out[4]) {
+    __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p + 8));
+    out[0] = lo(a);
+    out[1] = hi(a);
+    out[2] = lo(b);
+    out[3] = hi(b);
+  }
+  static __m128 part(const uint16_t* p) {
+    return lo(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)));
+  }
+};
+
+template <> struct ToFloat<float> {
+  static void block(const float* p, __m128 out[4]) {
+    for (int i = 0; i < 4; ++i) out[i] = _mm_loadu_ps(p + 4 * i);
+  }
+  static __m128 part(const float* p) { return _mm_loadu_ps(p); }
+};
+
+// Lane masks that select the pixels whose mask byte is zero (kept as they
+// were): all ones in the 32-bit lane of such a pixel.
+inline void keepLanes(const uint8_t* mask, __m128 keep[4]) {
+  __m128i zero = _mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(mask)), _mm_setzero_si128());
+  __m128i l = _mm_unpacklo_epi8(zero, zero), h = _mm_unpackhi_epi8(zero, zero);
+  keep[0] = _mm_castsi128_ps(_mm_unpacklo_epi16(l, l));
+  keep[1] = _mm_castsi128_ps(_mm_unpackhi_epi16(l, l));
+  keep[2] = _mm_castsi128_ps(_mm_unpacklo_epi16(h, h));
+  keep[3] = _mm_castsi128_ps(_mm_unpackhi_epi16(h, h));
+}
+inline __m128 keepLanes(const uint8_t* mask) {
+  int32_t bits;
+  memcpy(&bits, mask, 4);
+  __m128i zero = _mm_cmpeq_epi8(_mm_cvtsi32_si128(bits), _mm_setzero_si128());
+  zero = _mm_unpacklo_epi8(zero, zero);
+  return _mm_castsi128_ps(_mm_unpacklo_epi16(zero, zero));
+}
+// The old bits where `keep` is set, the new value elsewhere.
+inline __m128 select(__m128 keep, __m128 old, __m128 updated) {
+  return _mm_or_ps(_mm_and_ps(keep, old), _mm_andnot_ps(keep, updated));
+}
+
+// The formulas: a is the accumulator, s1 and s2 the converted sources.
+struct Add {
+  float operator()(float a, float s, float) const { return a + s; }
+  __m128 operator()(__m128 a, __m128 s, __m128) const { return _mm_add_ps(a, s); }
+};
+struct AddSquare {
+  float operator()(float a, float s, float) const { return a + s * s; }
+  __m128 operator()(__m128 a, __m128 s, __m128) const { return _mm_add_ps(a, _mm_mul_ps(s, s)); }
+};
+struct AddProduct {
+  float operator()(float a, float s1, float s2) const { return a + s1 * s2; }
+  __m128 operator()(__m128 a, __m128 s1, __m128 s2) const { return _mm_add_ps(a, _mm_mul_ps(s1, s2)); }
+};
+// The running average as one subtraction, one product and one sum.
+struct AddWeighted {
+  float alpha;
+  float operator()(float a, float s, float) const { return (s - a) * alpha + a; }
+  __m128 operator()(__m128 a, __m128 s, __m128) const {
+    return _mm_add_ps(_mm_mul_ps(_mm_sub_ps(s, a), _mm_set1_ps(alpha)), a);
+  }
+};
+
+// One row of an update. With kInPlace the accumulator read is the one
+// written (so its vector loads are aligned); otherwise it is a separate image.
+template <typename Src, int kSources, bool kMasked, bool kInPlace, typename Formula>
+class Row {
+ public:
+  static constexpr int kBlock = 16;
+  static constexpr int kPart = 4;
+
+  Row(const Src* src1, const Src* src2, const uint8_t* mask, const float* acc, float* out, const Formula& f)
+      : src1_(src1), src2_(src2), mask_(mask), acc_(acc), out_(out), f_(f) {}
+
+  const float* written() const { return out_; }
+
+  void one(int x) {
+    if (kMasked && !mask_[x]) return;
+    float s2 = kSources == 2 ? float(src2_[x]) : 0.0f;
+    out_[x] = f_(acc_[x], float(src1_[x]), s2);
+  }
+
+  template <StoreMode M>
+  void block(int x) {
+    __m128 s1[4], s2[4], keep[4];
+    ToFloat<Src>::block(src1_ + x, s1);
+    if (kSources == 2) ToFloat<Src>::block(src2_ + x, s2);
+    if (kMasked) keepLanes(mask_ + x, keep);
+    for (int i = 0; i < 4; ++i)
+      store<M>(x + 4 * i, s1[i], kSources == 2 ? s2[i] : s1[i], kMasked ? keep[i] : s1[i]);
+  }
+
+  template <StoreMode M>
+  void part(int x) {
+    __m128 s1 = ToFloat<Src>::part(src1_ + x);
+    __m128 s2 = kSources == 2 ? ToFloat<Src>::part(src2_ + x) : s1;
+    store<M>(x, s1, s2, kMasked ? keepLanes(mask_ + x) : s1);
+  }
+
+ private:
+  template <StoreMode M>
+  void store(int x, __m128 s1, __m128 s2, __m128 keep) {
+    __m128 a = kInPlace ? _mm_load_ps(acc_ + x) : _mm_loadu_ps(acc_ + x);
+    __m128 r = f_(a, s1, s2);
+    if (kMasked) r = select(keep, a, r);
+    simd::put<M, simd::Vec<float>>(out_ + x, r);
+  }
+
+  const Src* src1_;
+  const Src* src2_;
+  const uint8_t* mask_;
+  const float* acc_;
+  float* out_;
+  Formula f_;
+};
+
+// Images of one call. src2 and mask are unused (null) where the operation has
+// none; acc is the accumulator read, out the image written.
+template <typename Src>
+struct Images {
+  Plane<const Src> src1, src2;
+  Plane<const uint8_t> mask;
+  Plane<const float> acc;
+  Plane<float> out;
+};
+
+template <int kSources, bool kMasked, bool kInPlace, typename Src, typename Formula>
+void run(StoreMode mode, const Images<Src>& im, int width, int height, Formula f) {
+  driveRows(mode, width, height, [&](int y) {
+    return Row<Src, kSources, kMasked, kInPlace, Formula>(
+        im.src1.row(y), kSources == 2 ? im.src2.row(y) : nullptr, kMasked ? im.mask.row(y) : nullptr,
+        im.acc.row(y), im.out.row(y), f);
+  });
+}
+
+}  // namespace accumulate
+}  // namespace zelcv
+
+#endif  // ZELCV_KERNELS_ACCUMULATE_H
