@@ -82,6 +82,45 @@ template <> struct ToFloat<float> {
   static __m128 part(const float* p) { return _mm_loadu_ps(p); }
 };
 
+// Products of two 8-bit sources, formed exactly in 16-bit lanes and then
+// converted: they stay below 2^24, so they equal the single-precision product
+// of the converted sources bit for bit, at a fraction of the conversions.
+template <typename T> struct ExactProduct;
+
+template <> struct ExactProduct<uint8_t> {
+  static __m128i lo16(__m128i v) { return _mm_unpacklo_epi8(v, _mm_setzero_si128()); }
+  static __m128i hi16(__m128i v) { return _mm_unpackhi_epi8(v, _mm_setzero_si128()); }
+  static __m128 lo(__m128i p) { return ToFloat<uint8_t>::lo(p); }
+  static __m128 hi(__m128i p) { return ToFloat<uint8_t>::hi(p); }
+};
+template <> struct ExactProduct<int8_t> {
+  static __m128i lo16(__m128i v) { return ToFloat<int8_t>::lo16(v); }
+  static __m128i hi16(__m128i v) { return ToFloat<int8_t>::hi16(v); }
+  static __m128 lo(__m128i p) { return ToFloat<int8_t>::lo(p); }
+  static __m128 hi(__m128i p) { return ToFloat<int8_t>::hi(p); }
+};
+
+template <typename T>
+inline void exactProducts(const T* p1, const T* p2, __m128 out[4]) {
+  using P = ExactProduct<T>;
+  __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p1));
+  __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p2));
+  __m128i l = _mm_mullo_epi16(P::lo16(a), P::lo16(b));
+  __m128i h = _mm_mullo_epi16(P::hi16(a), P::hi16(b));
+  out[0] = P::lo(l);
+  out[1] = P::hi(l);
+  out[2] = P::lo(h);
+  out[3] = P::hi(h);
+}
+template <typename T>
+inline __m128 exactProducts(const T* p1, const T* p2) {
+  using P = ExactProduct<T>;
+  int32_t a, b;
+  memcpy(&a, p1, 4);
+  memcpy(&b, p2, 4);
+  return P::lo(_mm_mullo_epi16(P::lo16(_mm_cvtsi32_si128(a)), P::lo16(_mm_cvtsi32_si128(b))));
+}
+
 // Lane masks that select the pixels whose mask byte is zero (kept as they
 // were): all ones in the 32-bit lane of such a pixel.
 inline void keepLanes(const uint8_t* mask, __m128 keep[4]) {
@@ -105,20 +144,26 @@ inline __m128 select(__m128 keep, __m128 old, __m128 updated) {
 }
 
 // The formulas: a is the accumulator, s1 and s2 the converted sources.
+// kProduct: the formula is a + s1 x s2 (s2 = s1 for a square), so an exact
+// product may be passed to the plain sum instead.
 struct Add {
+  static constexpr bool kProduct = false;
   float operator()(float a, float s, float) const { return a + s; }
   __m128 operator()(__m128 a, __m128 s, __m128) const { return _mm_add_ps(a, s); }
 };
 struct AddSquare {
+  static constexpr bool kProduct = true;
   float operator()(float a, float s, float) const { return a + s * s; }
   __m128 operator()(__m128 a, __m128 s, __m128) const { return _mm_add_ps(a, _mm_mul_ps(s, s)); }
 };
 struct AddProduct {
+  static constexpr bool kProduct = true;
   float operator()(float a, float s1, float s2) const { return a + s1 * s2; }
   __m128 operator()(__m128 a, __m128 s1, __m128 s2) const { return _mm_add_ps(a, _mm_mul_ps(s1, s2)); }
 };
 // The running average as one subtraction, one product and one sum.
 struct AddWeighted {
+  static constexpr bool kProduct = false;
   float alpha;
   float operator()(float a, float s, float) const { return (s - a) * alpha + a; }
   __m128 operator()(__m128 a, __m128 s, __m128) const {
@@ -148,8 +193,12 @@ class Row {
   template <StoreMode M>
   void block(int x) {
     __m128 s1[4], s2[4], keep[4];
-    ToFloat<Src>::block(src1_ + x, s1);
-    if (kSources == 2) ToFloat<Src>::block(src2_ + x, s2);
+    if constexpr (kExactProduct) {
+      exactProducts(src1_ + x, second() + x, s1);
+    } else {
+      ToFloat<Src>::block(src1_ + x, s1);
+      if (kSources == 2) ToFloat<Src>::block(src2_ + x, s2);
+    }
     if (kMasked) keepLanes(mask_ + x, keep);
     for (int i = 0; i < 4; ++i)
       store<M>(x + 4 * i, s1[i], kSources == 2 ? s2[i] : s1[i], kMasked ? keep[i] : s1[i]);
@@ -157,16 +206,25 @@ class Row {
 
   template <StoreMode M>
   void part(int x) {
-    __m128 s1 = ToFloat<Src>::part(src1_ + x);
-    __m128 s2 = kSources == 2 ? ToFloat<Src>::part(src2_ + x) : s1;
+    __m128 s1, s2;
+    if constexpr (kExactProduct) {
+      s1 = s2 = exactProducts(src1_ + x, second() + x);
+    } else {
+      s1 = ToFloat<Src>::part(src1_ + x);
+      s2 = kSources == 2 ? ToFloat<Src>::part(src2_ + x) : s1;
+    }
     store<M>(x, s1, s2, kMasked ? keepLanes(mask_ + x) : s1);
   }
 
  private:
+  static constexpr bool kExactProduct = Formula::kProduct && sizeof(Src) == 1;
+
+  const Src* second() const { return kSources == 2 ? src2_ : src1_; }
+
   template <StoreMode M>
   void store(int x, __m128 s1, __m128 s2, __m128 keep) {
     __m128 a = kInPlace ? _mm_load_ps(acc_ + x) : _mm_loadu_ps(acc_ + x);
-    __m128 r = f_(a, s1, s2);
+    __m128 r = kExactProduct ? _mm_add_ps(a, s1) : f_(a, s1, s2);
     if (kMasked) r = select(keep, a, r);
     simd::put<M, simd::Vec<float>>(out_ + x, r);
   }
