@@ -7,6 +7,8 @@
 #include <stdint.h>
 #include <string.h>
 
+#include <type_traits>
+
 #include "kernels/row_driver.h"
 #include "kernels/simd.h"
 
@@ -82,9 +84,10 @@ template <> struct ToFloat<float> {
   static __m128 part(const float* p) { return _mm_loadu_ps(p); }
 };
 
-// Products of two 8-bit sources, formed exactly in 16-bit lanes and then
+// Products of 8-bit sources, formed exactly in 16-bit lanes and then
 // converted: they stay below 2^24, so they equal the single-precision product
-// of the converted sources bit for bit, at a fraction of the conversions.
+// of the converted sources (signed zeros aside), at a fraction of the
+// conversions.
 template <typename T> struct ExactProduct;
 
 template <> struct ExactProduct<uint8_t> {
@@ -123,8 +126,8 @@ inline __m128 exactProducts(const T* p1, const T* p2) {
 
 // Lane masks that select the pixels whose mask byte is zero (kept as they
 // were): all ones in the 32-bit lane of such a pixel.
-inline void keepLanes(const uint8_t* mask, __m128 keep[4]) {
-  __m128i zero = _mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(mask)), _mm_setzero_si128());
+// `zero` holds 0xFF for each mask byte that is zero.
+inline void keepLanes(__m128i zero, __m128 keep[4]) {
   __m128i l = _mm_unpacklo_epi8(zero, zero), h = _mm_unpackhi_epi8(zero, zero);
   keep[0] = _mm_castsi128_ps(_mm_unpacklo_epi16(l, l));
   keep[1] = _mm_castsi128_ps(_mm_unpackhi_epi16(l, l));
@@ -192,16 +195,19 @@ class Row {
 
   template <StoreMode M>
   void block(int x) {
-    __m128 s1[4], s2[4], keep[4];
-    if constexpr (kExactProduct) {
-      exactProducts(src1_ + x, second() + x, s1);
-    } else {
-      ToFloat<Src>::block(src1_ + x, s1);
-      if (kSources == 2) ToFloat<Src>::block(src2_ + x, s2);
+    __m128 keep[4] = {};
+    if constexpr (kMasked) {
+      // Masks are mostly runs: skip blocks where nothing is selected and
+      // drop the selection where everything is.
+      __m128i zero = _mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(mask_ + x)), _mm_setzero_si128());
+      int unselected = _mm_movemask_epi8(zero);
+      if (unselected == 0xFFFF) return;
+      if (unselected != 0) {
+        keepLanes(zero, keep);
+        return update<M, true>(x, keep);
+      }
     }
-    if (kMasked) keepLanes(mask_ + x, keep);
-    for (int i = 0; i < 4; ++i)
-      store<M>(x + 4 * i, s1[i], kSources == 2 ? s2[i] : s1[i], kMasked ? keep[i] : s1[i]);
+    update<M, false>(x, keep);
   }
 
   template <StoreMode M>
@@ -213,19 +219,34 @@ class Row {
       s1 = ToFloat<Src>::part(src1_ + x);
       s2 = kSources == 2 ? ToFloat<Src>::part(src2_ + x) : s1;
     }
-    store<M>(x, s1, s2, kMasked ? keepLanes(mask_ + x) : s1);
+    store<M, kMasked>(x, s1, s2, kMasked ? keepLanes(mask_ + x) : s1);
   }
 
  private:
-  static constexpr bool kExactProduct = Formula::kProduct && sizeof(Src) == 1;
+  // Not for products of two signed bytes: -3 x 0 is -0 in floating point,
+  // and a + -0 differs from a + 0 when a is -0.
+  static constexpr bool kExactProduct =
+      Formula::kProduct && sizeof(Src) == 1 && (std::is_unsigned<Src>::value || kSources == 1);
+
+  template <StoreMode M, bool kSelect>
+  void update(int x, const __m128 keep[4]) {
+    __m128 s1[4], s2[4];
+    if constexpr (kExactProduct) {
+      exactProducts(src1_ + x, second() + x, s1);
+    } else {
+      ToFloat<Src>::block(src1_ + x, s1);
+      if (kSources == 2) ToFloat<Src>::block(src2_ + x, s2);
+    }
+    for (int i = 0; i < 4; ++i) store<M, kSelect>(x + 4 * i, s1[i], kSources == 2 ? s2[i] : s1[i], keep[i]);
+  }
 
   const Src* second() const { return kSources == 2 ? src2_ : src1_; }
 
-  template <StoreMode M>
+  template <StoreMode M, bool kSelect>
   void store(int x, __m128 s1, __m128 s2, __m128 keep) {
     __m128 a = kInPlace ? _mm_load_ps(acc_ + x) : _mm_loadu_ps(acc_ + x);
     __m128 r = kExactProduct ? _mm_add_ps(a, s1) : f_(a, s1, s2);
-    if (kMasked) r = select(keep, a, r);
+    if (kSelect) r = select(keep, a, r);
     simd::put<M, simd::Vec<float>>(out_ + x, r);
   }
 

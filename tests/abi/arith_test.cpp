@@ -82,7 +82,7 @@ D referenceElement(const Export& e, D old, Src s1, Src s2, const Args& a) {
 template <typename T>
 T randomValue(std::mt19937& rng) {
   if constexpr (std::is_floating_point<T>::value) {
-    switch (rng() % 64) {
+    switch (rng() % 32) {
       case 0: return std::numeric_limits<float>::infinity();
       case 1: return -std::numeric_limits<float>::infinity();
       case 2: return -0.0f;
@@ -91,6 +91,8 @@ T randomValue(std::mt19937& rng) {
       default: return std::uniform_real_distribution<float>(-3000.0f, 3000.0f)(rng);
     }
   } else {
+    const T special[] = {T(0), T(1), T(-1), std::numeric_limits<T>::min(), std::numeric_limits<T>::max()};
+    if (rng() % 8 == 0) return special[rng() % 5];
     return T(std::uniform_int_distribution<long long>(std::numeric_limits<T>::min(),
                                                       std::numeric_limits<T>::max())(rng));
   }
@@ -130,12 +132,14 @@ struct Image {
   }
 };
 
-// Mask patterns: random with about half zeros, all zero, all set, sparse.
+// Mask patterns: about half set, none, all, few set, few unset.
+constexpr int kMaskPatterns = 5;
 void fillMask(Image<uint8_t>& mask, std::mt19937& rng, int pattern) {
   for (int y = 0; y < mask.layout.height; ++y)
     for (int x = 0; x < mask.layout.width; ++x) {
       uint8_t set = uint8_t(std::uniform_int_distribution<int>(1, 255)(rng));
-      bool on = pattern == 0 ? rng() % 2 == 0 : pattern == 1 ? false : pattern == 2 ? true : rng() % 8 == 0;
+      const bool choice[kMaskPatterns] = {rng() % 2 == 0, false, true, rng() % 8 == 0, rng() % 16 != 0};
+      bool on = choice[pattern];
       mask.row(y)[x] = on ? set : 0;
     }
 }
@@ -198,7 +202,7 @@ void compareWithReference(const Export& e, uint32_t seed, int trials) {
     Image<D> before(randomLayout<D>(rng, width, height, channels));
     src1.fill(rng);
     src2.fill(rng);
-    fillMask(mask, rng, trial % 4);
+    fillMask(mask, rng, trial % kMaskPatterns);
     before.fill(rng);  // the accumulator, or junk that a difference overwrites
 
     Args args;
