@@ -15,65 +15,58 @@
 namespace zelcv {
 namespace accumulate {
 
-// Exact conversion of source elements to single precision: one element, four
-// (a vector part) or sixteen (a block, as four vectors).
-template <typename T> struct ToFloat;
+// Widening of integer lanes: bytes to 16-bit lanes (lo16, hi16: the low and
+// high eight of sixteen), and 16-bit lanes to floats (lo, hi: the low and
+// high four of eight). All exact.
+template <typename T> struct Widen;
 
-template <> struct ToFloat<uint8_t> {
-  static __m128i widen16(__m128i v) { return _mm_unpacklo_epi8(v, _mm_setzero_si128()); }
-  static __m128 lo(__m128i v16) { return _mm_cvtepi32_ps(_mm_unpacklo_epi16(v16, _mm_setzero_si128())); }
-  static __m128 hi(__m128i v16) { return _mm_cvtepi32_ps(_mm_unpackhi_epi16(v16, _mm_setzero_si128())); }
-  static void block(const uint8_t* p, __m128 out[4]) {
-    __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
-    __m128i l = _mm_unpacklo_epi8(v, _mm_setzero_si128());
-    __m128i h = _mm_unpackhi_epi8(v, _mm_setzero_si128());
-    out[0] = lo(l);
-    out[1] = hi(l);
-    out[2] = lo(h);
-    out[3] = hi(h);
-  }
-  static __m128 part(const uint8_t* p) {
-    int32_t bits;
-    memcpy(&bits, p, 4);
-    return lo(widen16(_mm_cvtsi32_si128(bits)));
-  }
+template <> struct Widen<uint8_t> {
+  static __m128i lo16(__m128i v) { return _mm_unpacklo_epi8(v, _mm_setzero_si128()); }
+  static __m128i hi16(__m128i v) { return _mm_unpackhi_epi8(v, _mm_setzero_si128()); }
+  static __m128 lo(__m128i v) { return _mm_cvtepi32_ps(_mm_unpacklo_epi16(v, _mm_setzero_si128())); }
+  static __m128 hi(__m128i v) { return _mm_cvtepi32_ps(_mm_unpackhi_epi16(v, _mm_setzero_si128())); }
 };
+template <> struct Widen<uint16_t> : Widen<uint8_t> {};
 
-template <> struct ToFloat<int8_t> {
-  // Sign extension: the byte lands in the high half of a 16-bit lane, then
-  // an arithmetic shift brings it down (likewise 16 to 32 bits).
+// Sign extension: the value lands in the high half of a wider lane, then an
+// arithmetic shift brings it down.
+template <> struct Widen<int8_t> {
   static __m128i lo16(__m128i v) { return _mm_srai_epi16(_mm_unpacklo_epi8(v, v), 8); }
   static __m128i hi16(__m128i v) { return _mm_srai_epi16(_mm_unpackhi_epi8(v, v), 8); }
-  static __m128 lo(__m128i v16) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(v16, v16), 16)); }
-  static __m128 hi(__m128i v16) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpackhi_epi16(v16, v16), 16)); }
-  static void block(const int8_t* p, __m128 out[4]) {
-    __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
-    __m128i l = lo16(v), h = hi16(v);
-    out[0] = lo(l);
-    out[1] = hi(l);
-    out[2] = lo(h);
-    out[3] = hi(h);
+  static __m128 lo(__m128i v) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(v, v), 16)); }
+  static __m128 hi(__m128i v) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpackhi_epi16(v, v), 16)); }
+};
+
+// Sixteen 16-bit lanes (two vectors) as four float vectors.
+template <typename T>
+inline void toFloats(__m128i low, __m128i high, __m128 out[4]) {
+  out[0] = Widen<T>::lo(low);
+  out[1] = Widen<T>::hi(low);
+  out[2] = Widen<T>::lo(high);
+  out[3] = Widen<T>::hi(high);
+}
+
+inline __m128i loadu(const void* p) { return _mm_loadu_si128(static_cast<const __m128i*>(p)); }
+inline __m128i load4Bytes(const void* p) {
+  int32_t bits;
+  memcpy(&bits, p, 4);
+  return _mm_cvtsi32_si128(bits);
+}
+
+// Exact conversion of source elements to single precision: four (a vector
+// part) or sixteen (a block, as four vectors). Bytes first.
+template <typename T> struct ToFloat {
+  static void block(const T* p, __m128 out[4]) {
+    __m128i v = loadu(p);
+    toFloats<T>(Widen<T>::lo16(v), Widen<T>::hi16(v), out);
   }
-  static __m128 part(const int8_t* p) {
-    int32_t bits;
-    memcpy(&bits, p, 4);
-    return lo(lo16(_mm_cvtsi32_si128(bits)));
-  }
+  static __m128 part(const T* p) { return Widen<T>::lo(Widen<T>::lo16(load4Bytes(p))); }
 };
 
 template <> struct ToFloat<uint16_t> {
-  static __m128 lo(__m128i v) { return _mm_cvtepi32_ps(_mm_unpacklo_epi16(v, _mm_setzero_si128())); }
-  static __m128 hi(__m128i v) { return _mm_cvtepi32_ps(_mm_unpackhi_epi16(v, _mm_setzero_si128())); }
-  static void block(const uint16_t* p, __m128 out[4]) {
-    __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
-    __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p + 8));
-    out[0] = lo(a);
-    out[1] = hi(a);
-    out[2] = lo(b);
-    out[3] = hi(b);
-  }
+  static void block(const uint16_t* p, __m128 out[4]) { toFloats<uint16_t>(loadu(p), loadu(p + 8), out); }
   static __m128 part(const uint16_t* p) {
-    return lo(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)));
+    return Widen<uint16_t>::lo(_mm_loadl_epi64(static_cast<const __m128i*>(static_cast<const void*>(p))));
   }
 };
 
@@ -88,40 +81,16 @@ template <> struct ToFloat<float> {
 // converted: they stay below 2^24, so they equal the single-precision product
 // of the converted sources (signed zeros aside), at a fraction of the
 // conversions.
-template <typename T> struct ExactProduct;
-
-template <> struct ExactProduct<uint8_t> {
-  static __m128i lo16(__m128i v) { return _mm_unpacklo_epi8(v, _mm_setzero_si128()); }
-  static __m128i hi16(__m128i v) { return _mm_unpackhi_epi8(v, _mm_setzero_si128()); }
-  static __m128 lo(__m128i p) { return ToFloat<uint8_t>::lo(p); }
-  static __m128 hi(__m128i p) { return ToFloat<uint8_t>::hi(p); }
-};
-template <> struct ExactProduct<int8_t> {
-  static __m128i lo16(__m128i v) { return ToFloat<int8_t>::lo16(v); }
-  static __m128i hi16(__m128i v) { return ToFloat<int8_t>::hi16(v); }
-  static __m128 lo(__m128i p) { return ToFloat<int8_t>::lo(p); }
-  static __m128 hi(__m128i p) { return ToFloat<int8_t>::hi(p); }
-};
-
 template <typename T>
 inline void exactProducts(const T* p1, const T* p2, __m128 out[4]) {
-  using P = ExactProduct<T>;
-  __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p1));
-  __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p2));
-  __m128i l = _mm_mullo_epi16(P::lo16(a), P::lo16(b));
-  __m128i h = _mm_mullo_epi16(P::hi16(a), P::hi16(b));
-  out[0] = P::lo(l);
-  out[1] = P::hi(l);
-  out[2] = P::lo(h);
-  out[3] = P::hi(h);
+  using W = Widen<T>;
+  __m128i a = loadu(p1), b = loadu(p2);
+  toFloats<T>(_mm_mullo_epi16(W::lo16(a), W::lo16(b)), _mm_mullo_epi16(W::hi16(a), W::hi16(b)), out);
 }
 template <typename T>
 inline __m128 exactProducts(const T* p1, const T* p2) {
-  using P = ExactProduct<T>;
-  int32_t a, b;
-  memcpy(&a, p1, 4);
-  memcpy(&b, p2, 4);
-  return P::lo(_mm_mullo_epi16(P::lo16(_mm_cvtsi32_si128(a)), P::lo16(_mm_cvtsi32_si128(b))));
+  using W = Widen<T>;
+  return W::lo(_mm_mullo_epi16(W::lo16(load4Bytes(p1)), W::lo16(load4Bytes(p2))));
 }
 
 // Lane masks that select the pixels whose mask byte is zero (kept as they
@@ -135,9 +104,7 @@ inline void keepLanes(__m128i zero, __m128 keep[4]) {
   keep[3] = _mm_castsi128_ps(_mm_unpackhi_epi16(h, h));
 }
 inline __m128 keepLanes(const uint8_t* mask) {
-  int32_t bits;
-  memcpy(&bits, mask, 4);
-  __m128i zero = _mm_cmpeq_epi8(_mm_cvtsi32_si128(bits), _mm_setzero_si128());
+  __m128i zero = _mm_cmpeq_epi8(load4Bytes(mask), _mm_setzero_si128());
   zero = _mm_unpacklo_epi8(zero, zero);
   return _mm_castsi128_ps(_mm_unpacklo_epi16(zero, zero));
 }
@@ -199,7 +166,7 @@ class Row {
     if constexpr (kMasked) {
       // Masks are mostly runs: skip blocks where nothing is selected and
       // drop the selection where everything is.
-      __m128i zero = _mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(mask_ + x)), _mm_setzero_si128());
+      __m128i zero = _mm_cmpeq_epi8(loadu(mask_ + x), _mm_setzero_si128());
       int unselected = _mm_movemask_epi8(zero);
       if (unselected == 0xFFFF) return;
       if (unselected != 0) {
