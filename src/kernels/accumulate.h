@@ -204,7 +204,8 @@ class Row {
       ToFloat<Src>::block(src1_ + x, s1);
       if (kSources == 2) ToFloat<Src>::block(src2_ + x, s2);
     }
-    for (int i = 0; i < 4; ++i) store<M, kSelect>(x + 4 * i, s1[i], kSources == 2 ? s2[i] : s1[i], keep[i]);
+    for (int i = 0; i < 4; ++i)
+      store<M, kSelect>(x + 4 * i, s1[i], kSources == 2 && !kExactProduct ? s2[i] : s1[i], keep[i]);
   }
 
   const Src* second() const { return kSources == 2 ? src2_ : src1_; }
