@@ -16,16 +16,17 @@ using zelbench::randomMat;
 using zelbench::roiOf;
 using zelbench::stepOf;
 
-// The images of one case: two sources of the source type, a mask that
-// selects about half of the pixels, and the written image.
+// The images of one case: two sources of the source type, a mask of regions
+// (the brighter shapes of a natural picture, as a foreground mask would be)
+// and the written image.
 struct Images {
   cv::Mat src1, src2, mask, out;
   Images(const zelbench::Size& s, int srcType, int outType)
       : src1(randomMat(s.width, s.height, srcType, 1)),
         src2(randomMat(s.width, s.height, srcType, 2)),
-        mask(randomMat(s.width, s.height, CV_8UC1, 3)),
+        mask(zelbench::naturalImage(s.width, s.height, 3)),
         out(randomMat(s.width, s.height, outType, 4)) {
-    cv::threshold(mask, mask, 127, 255, cv::THRESH_BINARY);
+    cv::threshold(mask, mask, 120, 255, cv::THRESH_BINARY);
   }
 };
 

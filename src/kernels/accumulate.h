@@ -160,21 +160,13 @@ class Row {
     out_[x] = f_(acc_[x], float(src1_[x]), s2);
   }
 
+  // Masked blocks always select lane by lane: a branch on all-zero or
+  // all-set masks costs more in mispredictions at region edges than it saves.
   template <StoreMode M>
   void block(int x) {
     __m128 keep[4] = {};
-    if constexpr (kMasked) {
-      // Masks are mostly runs: skip blocks where nothing is selected and
-      // drop the selection where everything is.
-      __m128i zero = _mm_cmpeq_epi8(loadu(mask_ + x), _mm_setzero_si128());
-      int unselected = _mm_movemask_epi8(zero);
-      if (unselected == 0xFFFF) return;
-      if (unselected != 0) {
-        keepLanes(zero, keep);
-        return update<M, true>(x, keep);
-      }
-    }
-    update<M, false>(x, keep);
+    if (kMasked) keepLanes(_mm_cmpeq_epi8(loadu(mask_ + x), _mm_setzero_si128()), keep);
+    update<M, kMasked>(x, keep);
   }
 
   template <StoreMode M>
