@@ -28,6 +28,7 @@ int main(int argc, char** argv) {
                               image.height);
   /* Family steps go here, one call each. */
   failures |= demoArith(&image, outDir);
+  failures |= demoCanny(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }
