@@ -25,5 +25,6 @@ int demoCheck(const char* what, ZelStatus status);
 /* Family steps. */
 int demoCanny(const DemoImage* image, const char* outDir);
 int demoIntegral(const DemoImage* image, const char* outDir);
+int demoArith(const DemoImage* image, const char* outDir);
 
 #endif
