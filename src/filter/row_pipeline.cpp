@@ -1,0 +1,181 @@
+// The row pass of the separable pipeline: each source row is filtered
+// horizontally into the caller's row storage. Only the two extended ends of
+// a row are built in the work buffer; the middle is read in place.
+#include <stddef.h>
+#include <string.h>
+
+#include "core/alloc.h"
+#include "core/status.h"
+#include "filter/border.h"
+#include "filter/sepfilter_kernels.h"
+
+namespace zelcv {
+namespace {
+
+using sep::DoubleSum;
+using sep::FloatSum;
+using sep::LowScale;
+using sep::LowSum;
+
+// Checks shared by every row member, in their fixed order; the divisor test
+// that follows differs per member.
+template <typename S, int kChannels>
+ZelStatus checkRow(const S* src, int srcStep, void* const* dst, ZeliSize roi, const void* kernel,
+                   int kernelSize, int xAnchor, ZeliBorderType border, const void* borderValue,
+                   const Zel8u* buffer) {
+  if (ZelStatus s = checkPointers({src, dst, kernel, buffer})) return s;
+  if (ZelStatus s = checkSize(roi)) return s;
+  for (int y = 0; y < roi.height; ++y)
+    if (!dst[y]) return zelStatusNullPointer;
+  // Three-channel members refuse a null value array whatever the border kind.
+  if (kChannels == 3 && !borderValue) return zelStatusNullPointer;
+  if (kernelSize < 1) return zelStatusBadSize;
+  if (xAnchor < 0 || xAnchor >= kernelSize) return zelStatusBadAnchor;
+  if (ZelStatus s = checkSteps({image(src, srcStep, kChannels)}, roi.width)) return s;
+  // Exactly the three kinds the pipeline serves; flags are refused, and this
+  // family answers with zelStatusBadArgument rather than zelStatusBadBorder.
+  if (border != zelBorderConstant && border != zelBorderReplicate && border != zelBorderInMemory)
+    return zelStatusBadArgument;
+  return zelStatusOk;
+}
+
+template <class P, int kChannels, typename Tap>
+void runRows(const P& policy, const typename P::Source* src, int srcStep, typename P::Out* const* dst,
+             ZeliSize roi, const Tap* kernel, int kernelSize, int xAnchor, ZeliBorderType border,
+             const typename P::Source* borderValue, float scale, Zel8u* buffer) {
+  using S = typename P::Source;
+  using V = typename P::V;
+  constexpr int ch = kChannels;
+  // Buffer: the taps broadcast to vectors, then room for one extended end
+  // of (2 kernelSize - 2) pixels. The start is aligned up to 32 bytes.
+  uint8_t* base = alignUp(buffer, 32);
+  V* vecTaps = reinterpret_cast<V*>(base);
+  for (int k = 0; k < kernelSize; ++k) vecTaps[k] = P::Tap::broadcast(P::Tap::make(kernel[k], scale));
+  S* ext = reinterpret_cast<S*>(base + sizeof(V) * size_t(kernelSize));
+  const sep::PreparedTaps<P> taps{vecTaps};
+
+  const int width = roi.width;
+  const int right = kernelSize - 1 - xAnchor;
+  const size_t endBytes = size_t(kernelSize - 1) * ch * sizeof(S);
+  auto span = [&](const S* from, typename P::Out* out, int pixels) {
+    sep::filterSpanAnySize(policy, sep::RowSource<S>{from, ch}, out, pixels * ch, taps, kernelSize);
+  };
+  for (int y = 0; y < roi.height; ++y) {
+    const S* row = reinterpret_cast<const S*>(reinterpret_cast<const uint8_t*>(src) + ptrdiff_t(y) * srcStep);
+    typename P::Out* out = dst[y];
+    if (border == zelBorderInMemory) {  // both ends exist in memory
+      span(row - xAnchor * ch, out, width);
+    } else if (width >= kernelSize - 1) {
+      // Left end: xAnchor border pixels, then pixels 0 .. kernelSize-2.
+      extendRowBorder<S>(row, width, ch, border, borderValue, xAnchor, 0, ext, nullptr);
+      memcpy(ext + xAnchor * ch, row, endBytes);
+      span(ext, out, xAnchor);
+      span(row, out + xAnchor * ch, width - kernelSize + 1);
+      // Right end: the last kernelSize-1 pixels, then `right` border pixels.
+      memcpy(ext, row + (width - kernelSize + 1) * ch, endBytes);
+      extendRowBorder<S>(row, width, ch, border, borderValue, 0, right, nullptr, ext + (kernelSize - 1) * ch);
+      span(ext, out + (width - kernelSize + 1 + xAnchor) * ch, right);
+    } else {  // a row shorter than the kernel: wholly from the buffer
+      extendRowBorder<S>(row, width, ch, border, borderValue, xAnchor, right, ext, ext + (xAnchor + width) * ch);
+      memcpy(ext + xAnchor * ch, row, size_t(width) * ch * sizeof(S));
+      span(ext, out, width);
+    }
+  }
+}
+
+enum class DivisorRule { nonZero, positive, unchecked };
+
+inline bool divisorRefused(DivisorRule rule, int divisor) {
+  return (rule == DivisorRule::nonZero && divisor == 0) || (rule == DivisorRule::positive && divisor < 1);
+}
+
+// Members with a divisor: checks, then single-precision or fixed-point sums.
+template <class P, int kChannels, typename Tap>
+ZelStatus rowMember(const P& policy, DivisorRule rule, const typename P::Source* src, int srcStep,
+                    typename P::Out** dst, ZeliSize roi, const Tap* kernel, int kernelSize, int xAnchor,
+                    ZeliBorderType border, const typename P::Source* borderValue, int divisor, Zel8u* buffer) {
+  if (ZelStatus s = checkRow<typename P::Source, kChannels>(src, srcStep, reinterpret_cast<void* const*>(dst),
+                                                            roi, kernel, kernelSize, xAnchor, border,
+                                                            borderValue, buffer))
+    return s;
+  if (divisorRefused(rule, divisor)) return zelStatusBadArgument;
+  runRows<P, kChannels>(policy, src, srcStep, dst, roi, kernel, kernelSize, xAnchor, border, borderValue,
+                        1.0f / static_cast<float>(divisor), buffer);
+  return zelStatusOk;
+}
+
+template <int kChannels>
+ZelStatus rowMember32f(const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize roi, const Zel32f* kernel,
+                       int kernelSize, int xAnchor, ZeliBorderType border, const Zel32f* borderValue,
+                       Zel8u* buffer) {
+  if (ZelStatus s = checkRow<Zel32f, kChannels>(src, srcStep, reinterpret_cast<void* const*>(dst), roi, kernel,
+                                                kernelSize, xAnchor, border, borderValue, buffer))
+    return s;
+  runRows<DoubleSum, kChannels>(DoubleSum{}, src, srcStep, dst, roi, kernel, kernelSize, xAnchor, border,
+                                borderValue, 1.0f, buffer);
+  return zelStatusOk;
+}
+
+using Row16s = FloatSum<Zel16s, Zel16s, false>;
+using Row16u = FloatSum<Zel16u, Zel16u, false>;
+using Row8u16s = FloatSum<Zel8u, Zel16s, false>;
+
+}  // namespace
+}  // namespace zelcv
+
+using zelcv::DivisorRule;
+using zelcv::rowMember;
+
+#define ZELCV_ROW_PARAMS(S, D, Tap, Value)                                                        \
+  (const S* src, int srcStep, D** dst, ZeliSize roiSize, const Tap* kernel, int kernelSize, int xAnchor, \
+   ZeliBorderType borderType, Value borderValue, int divisor, Zel8u* buffer)
+
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_16s_C1R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, Zel16s) {
+  return rowMember<zelcv::Row16s, 1>({}, DivisorRule::nonZero, src, srcStep, dst, roiSize, kernel, kernelSize,
+                                     xAnchor, borderType, &borderValue, divisor, buffer);
+}
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_16s_C3R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, const Zel16s*) {
+  return rowMember<zelcv::Row16s, 3>({}, DivisorRule::nonZero, src, srcStep, dst, roiSize, kernel, kernelSize,
+                                     xAnchor, borderType, borderValue, divisor, buffer);
+}
+// A negative divisor is refused for unsigned data only.
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_16u_C1R) ZELCV_ROW_PARAMS(Zel16u, Zel16u, Zel16s, Zel16u) {
+  return rowMember<zelcv::Row16u, 1>({}, DivisorRule::positive, src, srcStep, dst, roiSize, kernel, kernelSize,
+                                     xAnchor, borderType, &borderValue, divisor, buffer);
+}
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_16u_C3R) ZELCV_ROW_PARAMS(Zel16u, Zel16u, Zel16s, const Zel16u*) {
+  return rowMember<zelcv::Row16u, 3>({}, DivisorRule::positive, src, srcStep, dst, roiSize, kernel, kernelSize,
+                                     xAnchor, borderType, borderValue, divisor, buffer);
+}
+// The one-channel 8u member never checked its divisor; a zero divisor makes
+// the scaled taps infinite or NaN and the results follow the clamp's rules.
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_8u16s_C1R) ZELCV_ROW_PARAMS(Zel8u, Zel16s, Zel16s, Zel8u) {
+  return rowMember<zelcv::Row8u16s, 1>({}, DivisorRule::unchecked, src, srcStep, dst, roiSize, kernel, kernelSize,
+                                       xAnchor, borderType, &borderValue, divisor, buffer);
+}
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_8u16s_C3R) ZELCV_ROW_PARAMS(Zel8u, Zel16s, Zel16s, const Zel8u*) {
+  return rowMember<zelcv::Row8u16s, 3>({}, DivisorRule::nonZero, src, srcStep, dst, roiSize, kernel, kernelSize,
+                                       xAnchor, borderType, borderValue, divisor, buffer);
+}
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_Low_16s_C1R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, Zel16s) {
+  return rowMember<zelcv::LowSum, 1>({zelcv::LowScale::of(divisor)}, DivisorRule::nonZero, src, srcStep, dst, roiSize,
+                                     kernel, kernelSize, xAnchor, borderType, &borderValue, divisor, buffer);
+}
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_Low_16s_C3R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, const Zel16s*) {
+  return rowMember<zelcv::LowSum, 3>({zelcv::LowScale::of(divisor)}, DivisorRule::nonZero, src, srcStep, dst, roiSize,
+                                     kernel, kernelSize, xAnchor, borderType, borderValue, divisor, buffer);
+}
+
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_32f_C1R)(const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize roiSize,
+                                                 const Zel32f* kernel, int kernelSize, int xAnchor,
+                                                 ZeliBorderType borderType, Zel32f borderValue, Zel8u* buffer) {
+  return zelcv::rowMember32f<1>(src, srcStep, dst, roiSize, kernel, kernelSize, xAnchor, borderType, &borderValue,
+                                buffer);
+}
+ZELCV_ENTRY(zeliFilterRowBorderPipeline_32f_C3R)(const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize roiSize,
+                                                 const Zel32f* kernel, int kernelSize, int xAnchor,
+                                                 ZeliBorderType borderType, const Zel32f* borderValue,
+                                                 Zel8u* buffer) {
+  return zelcv::rowMember32f<3>(src, srcStep, dst, roiSize, kernel, kernelSize, xAnchor, borderType, borderValue,
+                                buffer);
+}
