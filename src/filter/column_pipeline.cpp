@@ -4,6 +4,8 @@
 #include <stddef.h>
 #include <stdint.h>
 
+#include <type_traits>
+
 #include "core/status.h"
 #include "filter/sepfilter_kernels.h"
 
@@ -15,6 +17,16 @@ using sep::LowSum;
 using sep::SingleSum;
 
 enum class Divisor { checked, none };
+
+template <int kChannels, class P, class Taps>
+void runColumns(const P& policy, const Taps& taps, const typename P::Source* const* src, typename P::Out* dst,
+                int dstStep, ZeliSize roi, int kernelSize) {
+  const int n = roi.width * kChannels;
+  for (int y = 0; y < roi.height; ++y) {
+    auto* out = reinterpret_cast<typename P::Out*>(reinterpret_cast<uint8_t*>(dst) + ptrdiff_t(y) * dstStep);
+    sep::filterSpanAnySize(policy, sep::ColumnSource<typename P::Source>{src + y}, out, n, taps, kernelSize);
+  }
+}
 
 template <class P, int kChannels, typename Tap>
 ZelStatus columnMember(const P& policy, Divisor rule, const typename P::Source* const* src, typename P::Out* dst,
@@ -30,14 +42,25 @@ ZelStatus columnMember(const P& policy, Divisor rule, const typename P::Source* 
   if (!buffer) return zelStatusNullPointer;
   if (rule == Divisor::checked && divisor == 0) return zelStatusBadArgument;
 
+  const float scale = rule == Divisor::checked ? 1.0f / static_cast<float>(divisor) : 1.0f;
+  using D = typename P::Out;
+  if constexpr (std::is_same<P, FloatSum<Zel16s, D, true>>::value) {
+    // The exact integer form gives the same bits with pmaddwd; its tap pairs
+    // live on the stack, so it serves kernels of up to 2 kMaxPairs taps.
+    constexpr int kMaxPairs = 32;
+    int64_t tapSum = 0;
+    if (kernelSize <= 2 * kMaxPairs && sep::exactInFloat(kernel, kernelSize, divisor, 32768, &tapSum)) {
+      using Pairs = sep::PairSum<Zel16s, D, true>;
+      __m128i pairs[kMaxPairs];
+      Pairs::preparePairs(kernel, kernelSize, pairs);
+      runColumns<kChannels>(Pairs{pairs, scale}, sep::ComputedTaps<Pairs, Zel16s>{kernel, scale}, src, dst, dstStep,
+                            roi, kernelSize);
+      return zelStatusOk;
+    }
+  }
   // The taps are formed where they are used (the work buffer is sized by
   // the width, not the kernel); the sizes 3 and 5 keep them in registers.
-  const sep::ComputedTaps<P, Tap> taps{kernel, rule == Divisor::checked ? 1.0f / static_cast<float>(divisor) : 1.0f};
-  const int n = roi.width * kChannels;
-  for (int y = 0; y < roi.height; ++y) {
-    auto* out = reinterpret_cast<typename P::Out*>(reinterpret_cast<uint8_t*>(dst) + ptrdiff_t(y) * dstStep);
-    sep::filterSpanAnySize(policy, sep::ColumnSource<typename P::Source>{src + y, 0}, out, n, taps, kernelSize);
-  }
+  runColumns<kChannels>(policy, sep::ComputedTaps<P, Tap>{kernel, scale}, src, dst, dstStep, roi, kernelSize);
   return zelStatusOk;
 }
 

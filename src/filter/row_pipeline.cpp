@@ -4,6 +4,8 @@
 #include <stddef.h>
 #include <string.h>
 
+#include <type_traits>
+
 #include "core/alloc.h"
 #include "core/status.h"
 #include "filter/border.h"
@@ -39,21 +41,14 @@ ZelStatus checkRow(const S* src, int srcStep, void* const* dst, ZeliSize roi, co
   return zelStatusOk;
 }
 
-template <class P, int kChannels, typename Tap>
-void runRows(const P& policy, const typename P::Source* src, int srcStep, typename P::Out* const* dst,
-             ZeliSize roi, const Tap* kernel, int kernelSize, int xAnchor, ZeliBorderType border,
-             const typename P::Source* borderValue, float scale, Zel8u* buffer) {
+// Filters every row with `policy`; `ext` has room for one extended end of
+// 2 kernelSize - 2 pixels.
+template <class P, int kChannels, class Taps>
+void runRows(const P& policy, const Taps& taps, typename P::Source* ext, const typename P::Source* src,
+             int srcStep, typename P::Out* const* dst, ZeliSize roi, int kernelSize, int xAnchor,
+             ZeliBorderType border, const typename P::Source* borderValue) {
   using S = typename P::Source;
-  using V = typename P::V;
   constexpr int ch = kChannels;
-  // Buffer: the taps broadcast to vectors, then room for one extended end
-  // of (2 kernelSize - 2) pixels. The start is aligned up to 32 bytes.
-  uint8_t* base = alignUp(buffer, 32);
-  V* vecTaps = reinterpret_cast<V*>(base);
-  for (int k = 0; k < kernelSize; ++k) vecTaps[k] = P::Tap::broadcast(P::Tap::make(kernel[k], scale));
-  S* ext = reinterpret_cast<S*>(base + sizeof(V) * size_t(kernelSize));
-  const sep::PreparedTaps<P> taps{vecTaps};
-
   const int width = roi.width;
   const int right = kernelSize - 1 - xAnchor;
   const size_t endBytes = size_t(kernelSize - 1) * ch * sizeof(S);
@@ -83,6 +78,62 @@ void runRows(const P& policy, const typename P::Source* src, int srcStep, typena
   }
 }
 
+// Work buffer: the prepared taps (one 16-byte vector per tap), then one
+// extended row end. The start is aligned up to 32 bytes.
+struct RowBuffer {
+  __m128i* taps;
+  uint8_t* ext;
+  RowBuffer(Zel8u* buffer, int kernelSize) {
+    uint8_t* base = alignUp(buffer, 32);
+    taps = reinterpret_cast<__m128i*>(base);
+    ext = base + sizeof(__m128i) * size_t(kernelSize);
+  }
+};
+
+// Runs `policy` with its taps broadcast into the buffer.
+template <class P, int kChannels, typename Tap>
+void runPrepared(const P& policy, const RowBuffer& buf, const Tap* kernel, float scale,
+                 const typename P::Source* src, int srcStep, typename P::Out* const* dst, ZeliSize roi,
+                 int kernelSize, int xAnchor, ZeliBorderType border, const typename P::Source* borderValue) {
+  auto* vecTaps = reinterpret_cast<typename P::V*>(buf.taps);
+  for (int k = 0; k < kernelSize; ++k) vecTaps[k] = P::Tap::broadcast(P::Tap::make(kernel[k], scale));
+  runRows<P, kChannels>(policy, sep::PreparedTaps<P>{vecTaps}, reinterpret_cast<typename P::Source*>(buf.ext), src,
+                        srcStep, dst, roi, kernelSize, xAnchor, border, borderValue);
+}
+
+// Integer members: the exact integer forms where they give the same bits,
+// otherwise single-precision (or fixed-point) sums.
+template <class P, int kChannels>
+void runIntegerRows(const P& policy, const Zel16s* kernel, int divisor, const typename P::Source* src, int srcStep,
+                    typename P::Out* const* dst, ZeliSize roi, int kernelSize, int xAnchor, ZeliBorderType border,
+                    const typename P::Source* borderValue, Zel8u* buffer) {
+  using S = typename P::Source;
+  using D = typename P::Out;
+  const RowBuffer buf(buffer, kernelSize);
+  const float scale = 1.0f / static_cast<float>(divisor);
+  if constexpr (std::is_same<P, FloatSum<S, D, false>>::value && !std::is_same<S, Zel16u>::value) {
+    int64_t tapSum = 0;
+    const int64_t maxAbs = std::is_same<S, Zel8u>::value ? 255 : 32768;
+    if (sep::exactInFloat(kernel, kernelSize, divisor, maxAbs, &tapSum)) {
+      if constexpr (std::is_same<S, Zel8u>::value) {
+        if (tapSum * 255 <= 32767) {
+          runPrepared<sep::ShortSum, kChannels>(sep::ShortSum{scale, divisor == 1}, buf, kernel, scale, src, srcStep,
+                                                dst, roi, kernelSize, xAnchor, border, borderValue);
+          return;
+        }
+      }
+      using Pairs = sep::PairSum<S, D, false>;
+      Pairs::preparePairs(kernel, kernelSize, buf.taps);
+      runRows<Pairs, kChannels>(Pairs{buf.taps, scale}, sep::ComputedTaps<Pairs, Zel16s>{kernel, scale},
+                                reinterpret_cast<S*>(buf.ext), src, srcStep, dst, roi, kernelSize, xAnchor, border,
+                                borderValue);
+      return;
+    }
+  }
+  runPrepared<P, kChannels>(policy, buf, kernel, scale, src, srcStep, dst, roi, kernelSize, xAnchor, border,
+                            borderValue);
+}
+
 enum class DivisorRule { nonZero, positive, unchecked };
 
 inline bool divisorRefused(DivisorRule rule, int divisor) {
@@ -99,8 +150,8 @@ ZelStatus rowMember(const P& policy, DivisorRule rule, const typename P::Source*
                                                             borderValue, buffer))
     return s;
   if (divisorRefused(rule, divisor)) return zelStatusBadArgument;
-  runRows<P, kChannels>(policy, src, srcStep, dst, roi, kernel, kernelSize, xAnchor, border, borderValue,
-                        1.0f / static_cast<float>(divisor), buffer);
+  runIntegerRows<P, kChannels>(policy, kernel, divisor, src, srcStep, dst, roi, kernelSize, xAnchor, border,
+                               borderValue, buffer);
   return zelStatusOk;
 }
 
@@ -111,8 +162,8 @@ ZelStatus rowMember32f(const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize ro
   if (ZelStatus s = checkRow<Zel32f, kChannels>(src, srcStep, reinterpret_cast<void* const*>(dst), roi, kernel,
                                                 kernelSize, xAnchor, border, borderValue, buffer))
     return s;
-  runRows<DoubleSum, kChannels>(DoubleSum{}, src, srcStep, dst, roi, kernel, kernelSize, xAnchor, border,
-                                borderValue, 1.0f, buffer);
+  runPrepared<DoubleSum, kChannels>(DoubleSum{}, RowBuffer(buffer, kernelSize), kernel, 1.0f, src, srcStep, dst,
+                                    roi, kernelSize, xAnchor, border, borderValue);
   return zelStatusOk;
 }
 

@@ -24,14 +24,28 @@ struct RowSource {
   const S* base;
   int stride;
   const S* at(int k) const { return base + k * stride; }
+  template <int N> RowSource fixed() const { return *this; }
+};
+
+// Column pass with a kernel size known at compile time: the row pointers
+// copied into locals, so that stores to the output cannot make the
+// compiler reload them.
+template <typename S, int N>
+struct FixedColumnSource {
+  const S* rows[N];
+  const S* at(int k) const { return rows[k]; }
 };
 
 // Column pass: tap k reads row pointer k.
 template <typename S>
 struct ColumnSource {
   const S* const* rows;
-  int offset;
-  const S* at(int k) const { return rows[k] + offset; }
+  const S* at(int k) const { return rows[k]; }
+  template <int N> FixedColumnSource<S, N> fixed() const {
+    FixedColumnSource<S, N> f;
+    for (int k = 0; k < N; ++k) f.rows[k] = rows[k];
+    return f;
+  }
 };
 
 // ---- loads and stores ------------------------------------------------------
@@ -161,6 +175,11 @@ struct FloatSum {
   }
 };
 
+// Two floats widened to doubles (one cvtps2pd from memory).
+inline __m128d widen2(const float* p) {
+  return _mm_cvtps_pd(_mm_castpd_ps(_mm_load_sd(reinterpret_cast<const double*>(p))));
+}
+
 // 32f row pass: products and sum in double precision, one rounding to float.
 struct DoubleSum {
   using Source = float;
@@ -176,14 +195,14 @@ struct DoubleSum {
 
   template <class Src, class Taps>
   static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
-    __m128d a[4];
-    for (int k = 0; k < n; ++k) {
-      const float* p = src.at(k) + i;
-      __m128 lo = _mm_loadu_ps(p), hi = _mm_loadu_ps(p + 4);
-      __m128d d[4] = {_mm_cvtps_pd(lo), _mm_cvtps_pd(_mm_movehl_ps(lo, lo)), _mm_cvtps_pd(hi),
-                      _mm_cvtps_pd(_mm_movehl_ps(hi, hi))};
-      const __m128d t = taps.vec(k);
-      for (int j = 0; j < 4; ++j) a[j] = k == 0 ? _mm_mul_pd(t, d[j]) : _mm_add_pd(a[j], _mm_mul_pd(t, d[j]));
+    const float* p = src.at(0) + i;
+    __m128d t = taps.vec(0);
+    __m128d a[4] = {_mm_mul_pd(t, widen2(p)), _mm_mul_pd(t, widen2(p + 2)), _mm_mul_pd(t, widen2(p + 4)),
+                    _mm_mul_pd(t, widen2(p + 6))};
+    for (int k = 1; k < n; ++k) {
+      p = src.at(k) + i;
+      t = taps.vec(k);
+      for (int j = 0; j < 4; ++j) a[j] = _mm_add_pd(a[j], _mm_mul_pd(t, widen2(p + 2 * j)));
     }
     _mm_storeu_ps(out, _mm_movelh_ps(_mm_cvtpd_ps(a[0]), _mm_cvtpd_ps(a[1])));
     _mm_storeu_ps(out + 4, _mm_movelh_ps(_mm_cvtpd_ps(a[2]), _mm_cvtpd_ps(a[3])));
@@ -303,12 +322,153 @@ struct LowSum {
   }
 };
 
+// ---- exact integer forms of the single-precision contract ------------------
+//
+// When the divisor is a power of two (either sign) and sum|tap| x max|pixel|
+// < 2^24, every scaled tap, product and partial sum that FloatSum forms is an
+// exact float, so its sum is exactly (integer sum) x (1/divisor) whatever the
+// order. The policies below form that integer sum with integer instructions
+// and convert it once: the same bits as FloatSum with fewer instructions.
+
+inline bool exactInFloat(const int16_t* kernel, int count, int divisor, int64_t maxAbs, int64_t* tapSum) {
+  const int64_t d = divisor < 0 ? -int64_t(divisor) : divisor;
+  if (d == 0 || (d & (d - 1)) != 0) return false;
+  int64_t sum = 0;
+  for (int k = 0; k < count && sum * maxAbs < (int64_t(1) << 24); ++k) sum += kernel[k] < 0 ? -kernel[k] : kernel[k];
+  *tapSum = sum;
+  return sum * maxAbs < (int64_t(1) << 24);
+}
+
+// Eight elements widened to 16-bit lanes (8-bit data is unsigned).
+inline __m128i load8x16(const uint8_t* p) {
+  return _mm_unpacklo_epi8(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)), _mm_setzero_si128());
+}
+inline __m128i load8x16(const int16_t* p) { return simd::Vec<int16_t>::loadu(p); }
+
+// Integer taps for the exact policies (the accessor of their scalar tail).
+struct IntegerTap {
+  static int make(int16_t tap, float) { return tap; }
+  static __m128i broadcast(int a) { return _mm_set1_epi16(static_cast<short>(a)); }
+  static int lane0(__m128i v) { return static_cast<int16_t>(_mm_cvtsi128_si32(v)); }
+};
+
+// Converts exact integer sums to the output as FloatSum would.
+template <typename D, bool kRound>
+inline D convertExact(int32_t sum, float scale) {
+  float v = clampLikeVector(static_cast<float>(sum) * scale, Range<D>::lo, Range<D>::hi);
+  return static_cast<D>(kRound ? _mm_cvtss_si32(_mm_set_ss(v)) : _mm_cvttss_si32(_mm_set_ss(v)));
+}
+// |sum| < 2^24, so sum x scale converts without overflow, and since the
+// clamp limits are integers, clamping before the conversion equals the
+// saturation of the packing stores after it.
+template <typename D, bool kRound>
+inline void storeExact(D* out, __m128i a0, __m128i a1, float scale) {
+  const __m128 f = _mm_set1_ps(scale);
+  __m128 v0 = _mm_mul_ps(_mm_cvtepi32_ps(a0), f);
+  __m128 v1 = _mm_mul_ps(_mm_cvtepi32_ps(a1), f);
+  if (kRound)
+    store8(out, _mm_cvtps_epi32(v0), _mm_cvtps_epi32(v1));
+  else
+    store8(out, _mm_cvttps_epi32(v0), _mm_cvttps_epi32(v1));
+}
+
+// 32-bit sums from pmaddwd over pairs of taps: `pairs[j]` holds taps 2j and
+// 2j+1 in every 32-bit lane (the odd last tap pairs with 0).
+template <typename S, typename D, bool kRound>
+struct PairSum {
+  using Source = S;
+  using Out = D;
+  using V = __m128i;
+  using A = int;
+  using Tap = IntegerTap;
+  static constexpr int kBlock = 8;
+  const __m128i* pairs;
+  float scale;
+
+  static void preparePairs(const int16_t* kernel, int count, __m128i* pairs) {
+    for (int k = 0; k < count; k += 2) {
+      uint32_t lo = static_cast<uint16_t>(kernel[k]);
+      uint32_t hi = k + 1 < count ? static_cast<uint16_t>(kernel[k + 1]) : 0u;
+      pairs[k / 2] = _mm_set1_epi32(static_cast<int>(lo | (hi << 16)));
+    }
+  }
+
+  template <class Src, class Taps>
+  void block(const Src& src, int i, D* out, const Taps&, int n) const {
+    __m128i a0 = _mm_setzero_si128(), a1 = _mm_setzero_si128();
+    int k = 0;
+    for (; k + 1 < n; k += 2) {
+      __m128i p = load8x16(src.at(k) + i), q = load8x16(src.at(k + 1) + i);
+      a0 = _mm_add_epi32(a0, _mm_madd_epi16(_mm_unpacklo_epi16(p, q), pairs[k / 2]));
+      a1 = _mm_add_epi32(a1, _mm_madd_epi16(_mm_unpackhi_epi16(p, q), pairs[k / 2]));
+    }
+    if (k < n) {
+      const __m128i zero = _mm_setzero_si128();
+      __m128i p = load8x16(src.at(k) + i);
+      a0 = _mm_add_epi32(a0, _mm_madd_epi16(_mm_unpacklo_epi16(p, zero), pairs[k / 2]));
+      a1 = _mm_add_epi32(a1, _mm_madd_epi16(_mm_unpackhi_epi16(p, zero), pairs[k / 2]));
+    }
+    storeExact<D, kRound>(out, a0, a1, scale);
+  }
+
+  template <class Src, class Taps>
+  D one(const Src& src, int i, const Taps& t, int n) const {
+    int32_t sum = 0;
+    for (int k = 0; k < n; ++k) sum += t.scalar(k) * static_cast<int32_t>(src.at(k)[i]);
+    return convertExact<D, kRound>(sum, scale);
+  }
+};
+
+// 8-bit rows into 16-bit results with 16-bit sums, for taps small enough
+// that sum|tap| x 255 fits 15 bits (then no product or sum can wrap).
+struct ShortSum {
+  using Source = uint8_t;
+  using Out = int16_t;
+  using V = __m128i;
+  using A = int;
+  using Tap = IntegerTap;
+  static constexpr int kBlock = 16;
+  float scale;
+  bool unit;  // divisor 1: the sum is the result
+
+  template <class Src, class Taps>
+  void block(const Src& src, int i, int16_t* out, const Taps& taps, int n) const {
+    const __m128i zero = _mm_setzero_si128();
+    __m128i a0 = zero, a1 = zero;
+    for (int k = 0; k < n; ++k) {
+      __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(src.at(k) + i));
+      const __m128i t = taps.vec(k);
+      a0 = _mm_add_epi16(a0, _mm_mullo_epi16(_mm_unpacklo_epi8(v, zero), t));
+      a1 = _mm_add_epi16(a1, _mm_mullo_epi16(_mm_unpackhi_epi8(v, zero), t));
+    }
+    if (unit) {
+      simd::Vec<int16_t>::storeu(out, a0);
+      simd::Vec<int16_t>::storeu(out + 8, a1);
+      return;
+    }
+    storeExact<int16_t, false>(out, _mm_srai_epi32(_mm_unpacklo_epi16(a0, a0), 16),
+                               _mm_srai_epi32(_mm_unpackhi_epi16(a0, a0), 16), scale);
+    storeExact<int16_t, false>(out + 8, _mm_srai_epi32(_mm_unpacklo_epi16(a1, a1), 16),
+                               _mm_srai_epi32(_mm_unpackhi_epi16(a1, a1), 16), scale);
+  }
+
+  template <class Src, class Taps>
+  int16_t one(const Src& src, int i, const Taps& t, int n) const {
+    int32_t sum = 0;
+    for (int k = 0; k < n; ++k) sum += t.scalar(k) * static_cast<int32_t>(src.at(k)[i]);
+    return convertExact<int16_t, false>(sum, scale);
+  }
+};
+
 // ---- the span routine --------------------------------------------------------
 
 // n outputs of a kernel of `taps` taps; kKnown > 0 fixes the size at compile
 // time and keeps the taps in registers.
 template <int kKnown, class P, class Src, class Taps>
-void filterSpan(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+void filterSpan(const P& policyRef, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+  // A local copy: stores to `out` cannot change it, so its fields stay in
+  // registers across the loop.
+  const P policy = policyRef;
   int i = 0;
   if (kKnown > 0) {
     CachedTaps<P, (kKnown > 0 ? kKnown : 1)> cached;
@@ -316,11 +476,19 @@ void filterSpan(const P& policy, const Src& src, typename P::Out* out, int n, co
       cached.v[k] = taps.vec(k);
       cached.s[k] = taps.scalar(k);
     }
-    for (; i + P::kBlock <= n; i += P::kBlock) policy.block(src, i, out + i, cached, kKnown);
-    for (; i < n; ++i) out[i] = policy.one(src, i, cached, kKnown);
+    const auto fixed = src.template fixed<(kKnown > 0 ? kKnown : 1)>();
+    for (; i + P::kBlock <= n; i += P::kBlock) policy.block(fixed, i, out + i, cached, kKnown);
+    // The last partial block is computed again as a whole block ending at n:
+    // each output depends only on its own inputs, so the overlap rewrites
+    // the same values.
+    if (i < n && n >= P::kBlock) policy.block(fixed, n - P::kBlock, out + n - P::kBlock, cached, kKnown);
+    else
+      for (; i < n; ++i) out[i] = policy.one(fixed, i, cached, kKnown);
   } else {
     for (; i + P::kBlock <= n; i += P::kBlock) policy.block(src, i, out + i, taps, count);
-    for (; i < n; ++i) out[i] = policy.one(src, i, taps, count);
+    if (i < n && n >= P::kBlock) policy.block(src, n - P::kBlock, out + n - P::kBlock, taps, count);
+    else
+      for (; i < n; ++i) out[i] = policy.one(src, i, taps, count);
   }
 }
 
