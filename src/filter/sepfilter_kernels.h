@@ -181,12 +181,13 @@ inline __m128d widen2(const float* p) {
 }
 
 // 32f row pass: products and sum in double precision, one rounding to float.
+// Blocks of 4 keep the accumulators, taps and temporaries in registers.
 struct DoubleSum {
   using Source = float;
   using Out = float;
   using V = __m128d;
   using A = double;
-  static constexpr int kBlock = 8;
+  static constexpr int kBlock = 4;
   struct Tap {
     static A make(float tap, float) { return tap; }
     static V broadcast(A a) { return _mm_set1_pd(a); }
@@ -196,16 +197,13 @@ struct DoubleSum {
   template <class Src, class Taps>
   static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
     const float* p = src.at(0) + i;
-    __m128d t = taps.vec(0);
-    __m128d a[4] = {_mm_mul_pd(t, widen2(p)), _mm_mul_pd(t, widen2(p + 2)), _mm_mul_pd(t, widen2(p + 4)),
-                    _mm_mul_pd(t, widen2(p + 6))};
+    __m128d a0 = _mm_mul_pd(taps.vec(0), widen2(p)), a1 = _mm_mul_pd(taps.vec(0), widen2(p + 2));
     for (int k = 1; k < n; ++k) {
       p = src.at(k) + i;
-      t = taps.vec(k);
-      for (int j = 0; j < 4; ++j) a[j] = _mm_add_pd(a[j], _mm_mul_pd(t, widen2(p + 2 * j)));
+      a0 = _mm_add_pd(a0, _mm_mul_pd(taps.vec(k), widen2(p)));
+      a1 = _mm_add_pd(a1, _mm_mul_pd(taps.vec(k), widen2(p + 2)));
     }
-    _mm_storeu_ps(out, _mm_movelh_ps(_mm_cvtpd_ps(a[0]), _mm_cvtpd_ps(a[1])));
-    _mm_storeu_ps(out + 4, _mm_movelh_ps(_mm_cvtpd_ps(a[2]), _mm_cvtpd_ps(a[3])));
+    _mm_storeu_ps(out, _mm_movelh_ps(_mm_cvtpd_ps(a0), _mm_cvtpd_ps(a1)));
   }
 
   template <class Src, class Taps>
