@@ -22,4 +22,7 @@ int demoWritePgm(const char* outDir, const char* name, const Zel8u* pixels, int 
 /* Reports a failed call and returns 1, or returns 0 for zelStatusOk. */
 int demoCheck(const char* what, ZelStatus status);
 
+/* Family steps. */
+int demoFilter(const DemoImage* image, const char* outDir);
+
 #endif
