@@ -177,45 +177,30 @@ using Row8u16s = FloatSum<Zel8u, Zel16s, false>;
 using zelcv::DivisorRule;
 using zelcv::rowMember;
 
-#define ZELCV_ROW_PARAMS(S, D, Tap, Value)                                                        \
-  (const S* src, int srcStep, D** dst, ZeliSize roiSize, const Tap* kernel, int kernelSize, int xAnchor, \
-   ZeliBorderType borderType, Value borderValue, int divisor, Zel8u* buffer)
+// One-channel members take the border value by value, three-channel ones
+// by array (`valueArg` makes both a pointer).
+#define ZELCV_ROW_MEMBER(suffix, S, D, Value, valueArg, Policy, channels, policyValue, rule)                    \
+  ZELCV_ENTRY(zeliFilterRowBorderPipeline_##suffix)(const S* src, int srcStep, D** dst, ZeliSize roiSize,       \
+                                                    const Zel16s* kernel, int kernelSize, int xAnchor,         \
+                                                    ZeliBorderType borderType, Value borderValue, int divisor, \
+                                                    Zel8u* buffer) {                                           \
+    return rowMember<Policy, channels>(policyValue, DivisorRule::rule, src, srcStep, dst, roiSize, kernel,     \
+                                       kernelSize, xAnchor, borderType, valueArg, divisor, buffer);            \
+  }
 
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_16s_C1R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, Zel16s) {
-  return rowMember<zelcv::Row16s, 1>({}, DivisorRule::nonZero, src, srcStep, dst, roiSize, kernel, kernelSize,
-                                     xAnchor, borderType, &borderValue, divisor, buffer);
-}
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_16s_C3R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, const Zel16s*) {
-  return rowMember<zelcv::Row16s, 3>({}, DivisorRule::nonZero, src, srcStep, dst, roiSize, kernel, kernelSize,
-                                     xAnchor, borderType, borderValue, divisor, buffer);
-}
+ZELCV_ROW_MEMBER(16s_C1R, Zel16s, Zel16s, Zel16s, &borderValue, zelcv::Row16s, 1, {}, nonZero)
+ZELCV_ROW_MEMBER(16s_C3R, Zel16s, Zel16s, const Zel16s*, borderValue, zelcv::Row16s, 3, {}, nonZero)
 // A negative divisor is refused for unsigned data only.
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_16u_C1R) ZELCV_ROW_PARAMS(Zel16u, Zel16u, Zel16s, Zel16u) {
-  return rowMember<zelcv::Row16u, 1>({}, DivisorRule::positive, src, srcStep, dst, roiSize, kernel, kernelSize,
-                                     xAnchor, borderType, &borderValue, divisor, buffer);
-}
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_16u_C3R) ZELCV_ROW_PARAMS(Zel16u, Zel16u, Zel16s, const Zel16u*) {
-  return rowMember<zelcv::Row16u, 3>({}, DivisorRule::positive, src, srcStep, dst, roiSize, kernel, kernelSize,
-                                     xAnchor, borderType, borderValue, divisor, buffer);
-}
+ZELCV_ROW_MEMBER(16u_C1R, Zel16u, Zel16u, Zel16u, &borderValue, zelcv::Row16u, 1, {}, positive)
+ZELCV_ROW_MEMBER(16u_C3R, Zel16u, Zel16u, const Zel16u*, borderValue, zelcv::Row16u, 3, {}, positive)
 // The one-channel 8u member never checked its divisor; a zero divisor makes
 // the scaled taps infinite or NaN and the results follow the clamp's rules.
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_8u16s_C1R) ZELCV_ROW_PARAMS(Zel8u, Zel16s, Zel16s, Zel8u) {
-  return rowMember<zelcv::Row8u16s, 1>({}, DivisorRule::unchecked, src, srcStep, dst, roiSize, kernel, kernelSize,
-                                       xAnchor, borderType, &borderValue, divisor, buffer);
-}
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_8u16s_C3R) ZELCV_ROW_PARAMS(Zel8u, Zel16s, Zel16s, const Zel8u*) {
-  return rowMember<zelcv::Row8u16s, 3>({}, DivisorRule::nonZero, src, srcStep, dst, roiSize, kernel, kernelSize,
-                                       xAnchor, borderType, borderValue, divisor, buffer);
-}
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_Low_16s_C1R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, Zel16s) {
-  return rowMember<zelcv::LowSum, 1>({zelcv::LowScale::of(divisor)}, DivisorRule::nonZero, src, srcStep, dst, roiSize,
-                                     kernel, kernelSize, xAnchor, borderType, &borderValue, divisor, buffer);
-}
-ZELCV_ENTRY(zeliFilterRowBorderPipeline_Low_16s_C3R) ZELCV_ROW_PARAMS(Zel16s, Zel16s, Zel16s, const Zel16s*) {
-  return rowMember<zelcv::LowSum, 3>({zelcv::LowScale::of(divisor)}, DivisorRule::nonZero, src, srcStep, dst, roiSize,
-                                     kernel, kernelSize, xAnchor, borderType, borderValue, divisor, buffer);
-}
+ZELCV_ROW_MEMBER(8u16s_C1R, Zel8u, Zel16s, Zel8u, &borderValue, zelcv::Row8u16s, 1, {}, unchecked)
+ZELCV_ROW_MEMBER(8u16s_C3R, Zel8u, Zel16s, const Zel8u*, borderValue, zelcv::Row8u16s, 3, {}, nonZero)
+ZELCV_ROW_MEMBER(Low_16s_C1R, Zel16s, Zel16s, Zel16s, &borderValue, zelcv::LowSum, 1,
+                 {zelcv::LowScale::of(divisor)}, nonZero)
+ZELCV_ROW_MEMBER(Low_16s_C3R, Zel16s, Zel16s, const Zel16s*, borderValue, zelcv::LowSum, 3,
+                 {zelcv::LowScale::of(divisor)}, nonZero)
 
 ZELCV_ENTRY(zeliFilterRowBorderPipeline_32f_C1R)(const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize roiSize,
                                                  const Zel32f* kernel, int kernelSize, int xAnchor,

@@ -180,74 +180,71 @@ inline __m128d widen2(const float* p) {
   return _mm_cvtps_pd(_mm_castpd_ps(_mm_load_sd(reinterpret_cast<const double*>(p))));
 }
 
-// 32f row pass: products and sum in double precision, one rounding to float.
-// Blocks of 4 keep the accumulators, taps and temporaries in registers.
-struct DoubleSum {
-  using Source = float;
-  using Out = float;
+// Vector lanes of the accumulator type of the 32f members.
+template <typename Acc> struct Lanes;
+template <> struct Lanes<double> {
   using V = __m128d;
-  using A = double;
-  static constexpr int kBlock = 4;
-  struct Tap {
-    static A make(float tap, float) { return tap; }
-    static V broadcast(A a) { return _mm_set1_pd(a); }
-    static A lane0(V v) { return _mm_cvtsd_f64(v); }
-  };
-
-  template <class Src, class Taps>
-  static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
-    const float* p = src.at(0) + i;
-    __m128d a0 = _mm_mul_pd(taps.vec(0), widen2(p)), a1 = _mm_mul_pd(taps.vec(0), widen2(p + 2));
-    for (int k = 1; k < n; ++k) {
-      p = src.at(k) + i;
-      a0 = _mm_add_pd(a0, _mm_mul_pd(taps.vec(k), widen2(p)));
-      a1 = _mm_add_pd(a1, _mm_mul_pd(taps.vec(k), widen2(p + 2)));
-    }
-    _mm_storeu_ps(out, _mm_movelh_ps(_mm_cvtpd_ps(a0), _mm_cvtpd_ps(a1)));
-  }
-
-  template <class Src, class Taps>
-  static float one(const Src& src, int i, const Taps& t, int n) {
-    double acc = t.scalar(0) * static_cast<double>(src.at(0)[i]);
-    for (int k = 1; k < n; ++k) acc += t.scalar(k) * static_cast<double>(src.at(k)[i]);
-    return static_cast<float>(acc);
-  }
+  static constexpr int kCount = 2;
+  static V load(const float* p) { return widen2(p); }
+  static V mul(V a, V b) { return _mm_mul_pd(a, b); }
+  static V add(V a, V b) { return _mm_add_pd(a, b); }
+  static V set1(double a) { return _mm_set1_pd(a); }
+  static double lane0(V v) { return _mm_cvtsd_f64(v); }
+  static void store(float* out, V a0, V a1) { _mm_storeu_ps(out, _mm_movelh_ps(_mm_cvtpd_ps(a0), _mm_cvtpd_ps(a1))); }
 };
-
-// 32f column pass: single precision throughout.
-struct SingleSum {
-  using Source = float;
-  using Out = float;
+template <> struct Lanes<float> {
   using V = __m128;
-  using A = float;
-  static constexpr int kBlock = 8;
-  struct Tap {
-    static A make(float tap, float) { return tap; }
-    static V broadcast(A a) { return _mm_set1_ps(a); }
-    static A lane0(V v) { return _mm_cvtss_f32(v); }
-  };
-
-  template <class Src, class Taps>
-  static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
-    const float* p = src.at(0) + i;
-    __m128 a0 = _mm_mul_ps(taps.vec(0), _mm_loadu_ps(p));
-    __m128 a1 = _mm_mul_ps(taps.vec(0), _mm_loadu_ps(p + 4));
-    for (int k = 1; k < n; ++k) {
-      p = src.at(k) + i;
-      a0 = _mm_add_ps(a0, _mm_mul_ps(taps.vec(k), _mm_loadu_ps(p)));
-      a1 = _mm_add_ps(a1, _mm_mul_ps(taps.vec(k), _mm_loadu_ps(p + 4)));
-    }
+  static constexpr int kCount = 4;
+  static V load(const float* p) { return _mm_loadu_ps(p); }
+  static V mul(V a, V b) { return _mm_mul_ps(a, b); }
+  static V add(V a, V b) { return _mm_add_ps(a, b); }
+  static V set1(float a) { return _mm_set1_ps(a); }
+  static float lane0(V v) { return _mm_cvtss_f32(v); }
+  static void store(float* out, V a0, V a1) {
     _mm_storeu_ps(out, a0);
     _mm_storeu_ps(out + 4, a1);
   }
+};
+
+// 32f members: no divisor; products and sum in `Acc` (double for the row
+// pass, one rounding to float at the end; float for the column pass). A
+// block is two vectors, which keeps the double accumulators, the taps and
+// the temporaries in registers.
+template <typename Acc>
+struct FloatDataSum {
+  using L = Lanes<Acc>;
+  using Source = float;
+  using Out = float;
+  using V = typename L::V;
+  using A = Acc;
+  static constexpr int kBlock = 2 * L::kCount;
+  struct Tap {
+    static A make(float tap, float) { return tap; }
+    static V broadcast(A a) { return L::set1(a); }
+    static A lane0(V v) { return L::lane0(v); }
+  };
+
+  template <class Src, class Taps>
+  static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
+    const float* p = src.at(0) + i;
+    V a0 = L::mul(taps.vec(0), L::load(p)), a1 = L::mul(taps.vec(0), L::load(p + L::kCount));
+    for (int k = 1; k < n; ++k) {
+      p = src.at(k) + i;
+      a0 = L::add(a0, L::mul(taps.vec(k), L::load(p)));
+      a1 = L::add(a1, L::mul(taps.vec(k), L::load(p + L::kCount)));
+    }
+    L::store(out, a0, a1);
+  }
 
   template <class Src, class Taps>
   static float one(const Src& src, int i, const Taps& t, int n) {
-    float acc = t.scalar(0) * src.at(0)[i];
-    for (int k = 1; k < n; ++k) acc += t.scalar(k) * src.at(k)[i];
-    return acc;
+    Acc acc = t.scalar(0) * static_cast<Acc>(src.at(0)[i]);
+    for (int k = 1; k < n; ++k) acc += t.scalar(k) * static_cast<Acc>(src.at(k)[i]);
+    return static_cast<float>(acc);
   }
 };
+using DoubleSum = FloatDataSum<double>;
+using SingleSum = FloatDataSum<float>;
 
 // Fixed-point scaling of the _Low members: r = trunc(16384 / divisor) as a
 // 16-bit integer; a divisor of 1 skips it.

@@ -7,6 +7,9 @@
 #include <cstdint>
 #include <limits>
 #include <type_traits>
+#include <vector>
+
+#include <gtest/gtest.h>
 
 #include "zelcv.h"
 
@@ -77,17 +80,21 @@ double exactValue(const Tap* kernel, const S* p, int count, int divisor) {
 
 }  // namespace sepref
 
+// What both passes' members declare about themselves.
+#define ZELTEST_MEMBER_TRAITS(S_, D_, Tap_, channels_, arith_, rule_, suffix) \
+  using S = S_;                                                              \
+  using D = D_;                                                              \
+  using Tap = Tap_;                                                          \
+  static constexpr int channels = channels_;                                 \
+  static constexpr sepref::Arith arith = sepref::Arith::arith_;              \
+  static constexpr sepref::DivisorRule rule = sepref::DivisorRule::rule_;    \
+  static constexpr const char* name = #suffix;
+
 // Row members behind one shape: a null `value` for a one-channel member
 // passes 0 (the value is by value there).
 #define ZELTEST_ROW_MEMBER(Name, S_, D_, Tap_, channels_, arith_, rule_, suffix, valueArg, divArg)        \
   struct Name {                                                                                              \
-    using S = S_;                                                                                            \
-    using D = D_;                                                                                            \
-    using Tap = Tap_;                                                                                        \
-    static constexpr int channels = channels_;                                                               \
-    static constexpr sepref::Arith arith = sepref::Arith::arith_;                                            \
-    static constexpr sepref::DivisorRule rule = sepref::DivisorRule::rule_;                                  \
-    static constexpr const char* name = #suffix;                                                             \
+    ZELTEST_MEMBER_TRAITS(S_, D_, Tap_, channels_, arith_, rule_, suffix)                                    \
     static ZelStatus call(const S* src, int srcStep, D** dst, ZeliSize roi, const Tap* kernel, int size,    \
                           int anchor, ZeliBorderType border, const S* value, int divisor, Zel8u* buffer) {  \
       (void)divisor;                                                                                         \
@@ -117,13 +124,7 @@ ZELTEST_ROW_MEMBER(RowLowC3, Zel16s, Zel16s, Zel16s, 3, low, nonZero, Low_16s_C3
 
 #define ZELTEST_COLUMN_MEMBER(Name, S_, D_, Tap_, channels_, arith_, rule_, suffix, divArg)                 \
   struct Name {                                                                                              \
-    using S = S_;                                                                                            \
-    using D = D_;                                                                                            \
-    using Tap = Tap_;                                                                                        \
-    static constexpr int channels = channels_;                                                               \
-    static constexpr sepref::Arith arith = sepref::Arith::arith_;                                            \
-    static constexpr sepref::DivisorRule rule = sepref::DivisorRule::rule_;                                  \
-    static constexpr const char* name = #suffix;                                                             \
+    ZELTEST_MEMBER_TRAITS(S_, D_, Tap_, channels_, arith_, rule_, suffix)                                    \
     static ZelStatus call(const S** src, D* dst, int dstStep, ZeliSize roi, const Tap* kernel, int size,    \
                           int divisor, Zel8u* buffer) {                                                      \
       (void)divisor;                                                                                         \
@@ -149,6 +150,7 @@ ZELTEST_COLUMN_MEMBER(ColLowC3, Zel16s, Zel16s, Zel16s, 3, low, nonZero, Low_16s
 
 #undef ZELTEST_ROW_MEMBER
 #undef ZELTEST_COLUMN_MEMBER
+#undef ZELTEST_MEMBER_TRAITS
 
 // Random values that exercise a member's arithmetic: full-range pixels with
 // small or large taps, so that sums both fit and saturate.
@@ -163,13 +165,30 @@ T randomValue(R& rng, bool wide) {
   }
 }
 
+// Kernels of three kinds: small taps, full-range taps, and integer taps
+// whose absolute sum sits on either side of the limits below which the
+// library may form single-precision sums with exact integer arithmetic
+// (sum|tap| x 255 < 2^15 or 2^24 for 8-bit data, x 32768 < 2^24 for 16s).
+enum class TapKind { small, wide, boundary };
+
 template <typename Tap, typename R>
-Tap randomTap(R& rng, bool wide) {
-  if constexpr (std::is_floating_point<Tap>::value)
-    return Tap(std::uniform_real_distribution<double>(-2.0, 2.0)(rng));
-  else
-    return Tap(wide ? std::uniform_int_distribution<int>(-32768, 32767)(rng)
-                  : std::uniform_int_distribution<int>(-40, 40)(rng));
+std::vector<Tap> randomKernel(R& rng, int size, TapKind kind) {
+  std::vector<Tap> kernel(size);
+  if constexpr (std::is_floating_point<Tap>::value) {
+    for (Tap& t : kernel) t = Tap(std::uniform_real_distribution<double>(-2.0, 2.0)(rng));
+  } else {
+    static const int kLimits[] = {128, 129, 511, 512, 65792, 65793};
+    int target = kLimits[rng() % 6];
+    if (kind == TapKind::boundary && (target + size - 1) / size > 32767) target = 512;
+    for (int k = 0; k < size; ++k) {
+      int v = kind == TapKind::wide    ? std::uniform_int_distribution<int>(-32768, 32767)(rng)
+              : kind == TapKind::small ? std::uniform_int_distribution<int>(-40, 40)(rng)
+                                       : target / size + (k < target % size ? 1 : 0);
+      if (kind == TapKind::boundary && rng() % 2) v = -v;
+      kernel[k] = Tap(v);
+    }
+  }
+  return kernel;
 }
 
 template <class M, typename R>
@@ -178,6 +197,18 @@ int randomDivisor(R& rng) {
   int d = kDivisors[std::uniform_int_distribution<int>(0, 13)(rng)];
   if (M::rule == sepref::DivisorRule::positive && d < 0) d = -d;
   return d;
+}
+
+// A valid call with one change applied must give `want`; a refused call
+// must leave the output as it was.
+template <class Call, class Change>
+void expectStatus(ZelStatus want, Change&& change, const char* what) {
+  Call call;
+  change(call);
+  EXPECT_EQ(call.run(), want) << what;
+  if (want != zelStatusOk) {
+    EXPECT_TRUE(call.untouched()) << what;
+  }
 }
 
 }  // namespace zeltest
