@@ -173,6 +173,19 @@ ZELCV_API ZelStatus zeliPyramidLayerUpFree_32f_C3R(ZeliPyramidLayerState* state)
  * members sum in single precision and round to nearest (ties to even) at
  * every pixel; _Low as the row pass; 32f sums in single precision.
  *
+ * Row checks, first failure wins: src, dst, kernel or buffer null (-8);
+ * width or height < 1 (-6); any dst[0 .. height-1] null (-8); C3 members: a
+ * null borderValue array (-8, whatever the border); kernelSize < 1 (-6);
+ * xAnchor outside 0 .. kernelSize-1 (-34); srcStep below the row bytes
+ * (-14); 16-bit srcStep odd or 32f srcStep not a multiple of 4 (-108);
+ * borderType (-5); divisor: 0 refused (-5) by 16s, 8u16s_C3R and _Low, < 1
+ * refused by 16u, not checked by 8u16s_C1R (a zero divisor then yields the
+ * clamp limits).
+ * Column checks: src, dst or kernel null (-8); width or height < 1 (-6); any
+ * src[0 .. kernelSize+height-2] null (-8, before kernelSize is validated);
+ * kernelSize < 1 (-6); dstStep (-14, -108); buffer null (-8); integer
+ * members: divisor 0 (-5).
+ *
  * Work buffers: the sizes that the GetBufferSize queries report (any
  * alignment). A query whose size would not fit in an int gives
  * zelStatusBadSize. */

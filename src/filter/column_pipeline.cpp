@@ -1,6 +1,8 @@
 // The column pass of the separable pipeline: kernelSize consecutive row
 // pointers make one output row. The caller expresses vertical borders by the
 // pointers it passes, so nothing here looks beyond the rows it is given.
+// The sums of a block stay in registers, so these loops leave the work
+// buffer untouched; it is still required (and checked) by the interface.
 #include <stddef.h>
 #include <stdint.h>
 
