@@ -23,6 +23,7 @@ int demoWritePgm(const char* outDir, const char* name, const Zel8u* pixels, int 
 int demoCheck(const char* what, ZelStatus status);
 
 /* Family steps. */
+int demoCanny(const DemoImage* image, const char* outDir);
 int demoFilter(const DemoImage* image, const char* outDir);
 
 #endif

@@ -27,6 +27,7 @@ int main(int argc, char** argv) {
   int failures = demoWritePgm(outDir, "input.pgm", image.pixels, image.step, image.width,
                               image.height);
   /* Family steps go here, one call each. */
+  failures |= demoCanny(&image, outDir);
   failures |= demoFilter(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;

@@ -1,0 +1,63 @@
+// First-derivative filters of 8-bit images (3x3 Sobel, 3x3 Scharr, 5x5
+// Sobel), produced one output row at a time so that a caller can consume the
+// derivatives while they are still in the first-level cache. The Canny
+// detector streams through them; the exported derivative filters build on the
+// same rows.
+#ifndef ZELCV_FILTER_DERIVATIVE_H
+#define ZELCV_FILTER_DERIVATIVE_H
+
+#include <stddef.h>
+#include <stdint.h>
+
+#include "zelcv.h"
+
+namespace zelcv {
+
+// Separable kernels: a derivative across one axis times a smoothing along the
+// other.
+//   kSobel3x3:  derivative -1 0 1,       smoothing 1 2 1
+//   kScharr3x3: derivative -1 0 1,       smoothing 3 10 3
+//   kSobel5x5:  derivative -1 -2 0 2 1,  smoothing 1 4 6 4 1
+// dx is positive where brightness grows to the right, dy where it grows
+// downwards. No result leaves the 16-bit range (at most 24480 in magnitude).
+enum class DerivativeKernel { kSobel3x3, kScharr3x3, kSobel5x5 };
+
+inline int derivativeRadius(DerivativeKernel kernel) {
+  return kernel == DerivativeKernel::kSobel5x5 ? 2 : 1;
+}
+
+// Pixels outside the image come from the border type: zelBorderConstant
+// (borderValue), replicate, wrap, the mirror kinds, and the in-memory kind or
+// side flags (read at their natural addresses). A pixel beyond both a row end
+// and a column end is found by the vertical rule first (which row stands for
+// it), then by the horizontal rule within that row; a constant row stays
+// constant whatever the horizontal rule.
+class DerivativeRows {
+ public:
+  // Scratch bytes that the constructor's `scratch` must provide (no alignment
+  // needed).
+  static size_t scratchBytes(DerivativeKernel kernel, int width);
+
+  DerivativeRows(const Zel8u* src, int srcStep, ZeliSize roi, DerivativeKernel kernel,
+                 ZeliBorderType border, Zel8u borderValue, void* scratch);
+
+  // dx and dy of image row y (0 <= y < height), width values each.
+  void row(int y, Zel16s* dx, Zel16s* dy) const;
+
+ private:
+  const Zel8u* sourceRow(int y) const;
+
+  const Zel8u* src_;
+  int srcStep_;
+  ZeliSize roi_;
+  DerivativeKernel kernel_;
+  ZeliBorderType border_;
+  Zel8u borderValue_;
+  Zel16s* smooth_;  // width + 2 * radius column sums across rows
+  Zel16s* diff_;    // width + 2 * radius column differences across rows
+  Zel8u* constantRow_;  // width pixels of borderValue (constant kind only)
+};
+
+}  // namespace zelcv
+
+#endif  // ZELCV_FILTER_DERIVATIVE_H
