@@ -26,5 +26,6 @@ int demoCheck(const char* what, ZelStatus status);
 int demoCanny(const DemoImage* image, const char* outDir);
 int demoIntegral(const DemoImage* image, const char* outDir);
 int demoArith(const DemoImage* image, const char* outDir);
+int demoFilter(const DemoImage* image, const char* outDir);
 
 #endif

@@ -30,6 +30,7 @@ int main(int argc, char** argv) {
   failures |= demoArith(&image, outDir);
   failures |= demoCanny(&image, outDir);
   failures |= demoIntegral(&image, outDir);
+  failures |= demoFilter(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }
