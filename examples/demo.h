@@ -27,5 +27,6 @@ int demoCanny(const DemoImage* image, const char* outDir);
 int demoIntegral(const DemoImage* image, const char* outDir);
 int demoArith(const DemoImage* image, const char* outDir);
 int demoFilter(const DemoImage* image, const char* outDir);
+int demoMorph(const DemoImage* image, const char* outDir);
 
 #endif

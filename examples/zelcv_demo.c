@@ -31,6 +31,7 @@ int main(int argc, char** argv) {
   failures |= demoCanny(&image, outDir);
   failures |= demoIntegral(&image, outDir);
   failures |= demoFilter(&image, outDir);
+  failures |= demoMorph(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

@@ -1,0 +1,392 @@
+// Row kernels for running maxima and minima, shared by the morphology
+// families: element-wise combination of rows, horizontal window maxima (one
+// kernel per width 1..15, and a generic kernel that builds 4-, 16-, 64-...
+// pixel windows, so that its cost grows with the logarithm of the width),
+// and shifted combination with replicated or in-memory row ends. Elements of a multi-channel row are independent; a
+// window step is one pixel, that is `channels` elements.
+#ifndef ZELCV_KERNELS_MINMAX_H
+#define ZELCV_KERNELS_MINMAX_H
+
+#include <string.h>
+
+#include <utility>
+
+#include "kernels/simd.h"
+
+namespace zelcv {
+namespace minmax {
+
+// Scalar and vector operations agree on every ordered value: the scalar forms
+// repeat what the vector instructions do (first operand when it wins).
+template <typename T>
+struct MaxOp {
+  using V = simd::Vec<T>;
+  static T s(T a, T b) { return a > b ? a : b; }
+  static typename V::Raw v(typename V::Raw a, typename V::Raw b) { return V::max(a, b); }
+};
+template <typename T>
+struct MinOp {
+  using V = simd::Vec<T>;
+  static T s(T a, T b) { return a < b ? a : b; }
+  static typename V::Raw v(typename V::Raw a, typename V::Raw b) { return V::min(a, b); }
+};
+
+// A kernel template instantiated for counts 1..N, indexed by the count;
+// `Which::get<N, T, Op>()` names the instance.
+template <typename Which, typename T, typename Op, typename Counts>
+struct CountTable;
+template <typename Which, typename T, typename Op, int... N>
+struct CountTable<Which, T, Op, std::integer_sequence<int, N...>> {
+  using Kernel = decltype(Which::template get<1, T, Op>());
+  static constexpr Kernel kernel[] = {nullptr, Which::template get<N + 1, T, Op>()...};
+};
+template <typename Which, typename T, typename Op, int Most>
+using CountTableTo = CountTable<Which, T, Op, std::make_integer_sequence<int, Most>>;
+
+// out[i] = op over rows[k][i], k < N, i < n.
+template <int N, typename T, typename Op>
+void combineRowsFixed(T* out, const T* const* rows, int n) {
+  using V = simd::Vec<T>;
+  const T* r[N];
+  for (int k = 0; k < N; ++k) r[k] = rows[k];
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    auto m = V::loadu(r[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(r[k] + i));
+    V::storeu(out + i, m);
+  }
+  for (; i < n; ++i) {
+    T m = r[0][i];
+    for (int k = 1; k < N; ++k) m = Op::s(m, r[k][i]);
+    out[i] = m;
+  }
+}
+
+struct CombineRows {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &combineRowsFixed<N, T, Op>; }
+};
+
+// out[i] = op over rows[k][i], k < count (count >= 1), i < n: up to eight
+// rows at a time.
+template <typename T, typename Op>
+void combineRows(T* out, const T* const* rows, int count, int n) {
+  constexpr int kMost = 8;
+  using Table = CountTableTo<CombineRows, T, Op, kMost>;
+  Table::kernel[count < kMost ? count : kMost](out, rows, n);
+  const T* pair[kMost];
+  for (int k = kMost; k < count; k += kMost - 1) {
+    const int take = count - k < kMost - 1 ? count - k : kMost - 1;
+    pair[0] = out;
+    for (int j = 0; j < take; ++j) pair[j + 1] = rows[k + j];
+    Table::kernel[take + 1](out, pair, n);
+  }
+}
+
+// Two output rows of a vertical window that share all rows but the first
+// of the upper window and the last of the lower one:
+// out0 = op(common, first), out1 = op(common, last), common = op over the
+// N rows of `common`.
+template <int N, typename T, typename Op>
+void combinePair(T* out0, T* out1, const T* const* common, const T* first, const T* last, int n) {
+  using V = simd::Vec<T>;
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    auto m = V::loadu(common[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(common[k] + i));
+    V::storeu(out0 + i, Op::v(m, V::loadu(first + i)));
+    V::storeu(out1 + i, Op::v(m, V::loadu(last + i)));
+  }
+  for (; i < n; ++i) {
+    T m = common[0][i];
+    for (int k = 1; k < N; ++k) m = Op::s(m, common[k][i]);
+    out0[i] = Op::s(m, first[i]);
+    out1[i] = Op::s(m, last[i]);
+  }
+}
+
+struct CombinePair {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &combinePair<N, T, Op>; }
+};
+
+// Four output rows of a vertical window of N + 3 rows (N >= 0), from the
+// N rows all four share, the three rows before them and the three after:
+// out[0] = op(common, a0, a1, a2), out[1] = op(common, a1, a2, b0),
+// out[2] = op(common, a2, b0, b1), out[3] = op(common, b0, b1, b2).
+template <int N, typename T, typename Op>
+void combineQuad(T* const* out, const T* const* common, const T* const* a, const T* const* b, int n) {
+  using V = simd::Vec<T>;
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    const auto a2 = V::loadu(a[2] + i), a1 = Op::v(V::loadu(a[1] + i), a2), a0 = Op::v(V::loadu(a[0] + i), a1);
+    const auto b0 = V::loadu(b[0] + i), b1 = Op::v(b0, V::loadu(b[1] + i)), b2 = Op::v(b1, V::loadu(b[2] + i));
+    if constexpr (N == 0) {
+      V::storeu(out[0] + i, a0);
+      V::storeu(out[1] + i, Op::v(a1, b0));
+      V::storeu(out[2] + i, Op::v(a2, b1));
+      V::storeu(out[3] + i, b2);
+    } else {
+      auto m = V::loadu(common[0] + i);
+      for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(common[k] + i));
+      V::storeu(out[0] + i, Op::v(m, a0));
+      V::storeu(out[1] + i, Op::v(m, Op::v(a1, b0)));
+      V::storeu(out[2] + i, Op::v(m, Op::v(a2, b1)));
+      V::storeu(out[3] + i, Op::v(m, b2));
+    }
+  }
+  for (; i < n; ++i) {
+    const T a2 = a[2][i], a1 = Op::s(a[1][i], a2), a0 = Op::s(a[0][i], a1);
+    const T b0 = b[0][i], b1 = Op::s(b0, b[1][i]), b2 = Op::s(b1, b[2][i]);
+    T m0 = a0, m1 = Op::s(a1, b0), m2 = Op::s(a2, b1), m3 = b2;
+    for (int k = 0; k < N; ++k) {
+      m0 = Op::s(common[k][i], m0);
+      m1 = Op::s(common[k][i], m1);
+      m2 = Op::s(common[k][i], m2);
+      m3 = Op::s(common[k][i], m3);
+    }
+    out[0][i] = m0;
+    out[1][i] = m1;
+    out[2][i] = m2;
+    out[3][i] = m3;
+  }
+}
+
+struct CombineQuad {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &combineQuad<N - 1, T, Op>; }
+};
+
+// One step of the van Herk / Gil-Werman vertical pass: the running prefix of
+// the current block (prefixIn null at its first row), and the output row as
+// the maximum of the previous block's suffix and that prefix.
+template <typename T, typename Op>
+void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* suffix, int n) {
+  using V = simd::Vec<T>;
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    auto p = V::loadu(h + i);
+    if (prefixIn) p = Op::v(V::loadu(prefixIn + i), p);
+    V::storeu(prefixOut + i, p);
+    V::storeu(out + i, Op::v(V::loadu(suffix + i), p));
+  }
+  for (; i < n; ++i) {
+    T p = prefixIn ? Op::s(prefixIn[i], h[i]) : h[i];
+    prefixOut[i] = p;
+    out[i] = Op::s(suffix[i], p);
+  }
+}
+
+// m[i] = op(m[i], m[i + offset]) for i < n, ascending, so that it may run in
+// place over a row whose later part it still reads; `a` and `b` may alias
+// `out` in that way only.
+template <typename T, typename Op>
+void combineForward(T* out, const T* a, const T* b, int n) {
+  using V = simd::Vec<T>;
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) V::storeu(out + i, Op::v(V::loadu(a + i), V::loadu(b + i)));
+  for (; i < n; ++i) out[i] = Op::s(a[i], b[i]);
+}
+
+// out[i] = op over src[i + offsets[k]], k < N, for i < n elements.
+template <int N, typename T, typename Op>
+void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
+  using V = simd::Vec<T>;
+  int o[N];
+  for (int k = 0; k < N; ++k) o[k] = offsets[k];
+  int i = 0;
+  // Two vectors per step; both are loaded before either is stored, which
+  // keeps the in-place use with forward offsets valid.
+  for (; i + 2 * V::kLanes <= n; i += 2 * V::kLanes) {
+    auto m = V::loadu(src + i + o[0]);
+    auto m2 = V::loadu(src + i + V::kLanes + o[0]);
+    for (int k = 1; k < N; ++k) {
+      m = Op::v(m, V::loadu(src + i + o[k]));
+      m2 = Op::v(m2, V::loadu(src + i + V::kLanes + o[k]));
+    }
+    V::storeu(out + i, m);
+    V::storeu(out + i + V::kLanes, m2);
+  }
+  for (; i + V::kLanes <= n; i += V::kLanes) {
+    auto m = V::loadu(src + i + o[0]);
+    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(src + i + o[k]));
+    V::storeu(out + i, m);
+  }
+  for (; i < n; ++i) {
+    T m = src[i + o[0]];
+    for (int k = 1; k < N; ++k) m = Op::s(m, src[i + o[k]]);
+    out[i] = m;
+  }
+}
+
+// out[i] = op over src[i + k * step], k < K, for i < n elements: the kernel
+// specialised for one window width.
+template <int K, typename T, typename Op>
+void windowFixed(const T* src, T* out, int n, int step) {
+  int offsets[K];
+  for (int k = 0; k < K; ++k) offsets[k] = k * step;
+  windowOffsetsFixed<K, T, Op>(src, out, n, offsets);
+}
+
+
+// out[i] = op(a[i], b[i]) for i < n, descending, so that it may write a
+// row of window results `shift` elements further on in the row it reads, as
+// long as b - a <= shift.
+template <typename T, typename Op>
+void combineBackward(T* out, const T* a, const T* b, int n) {
+  using V = simd::Vec<T>;
+  int i = n;
+  for (; i >= V::kLanes; i -= V::kLanes)
+    V::storeu(out + i - V::kLanes, Op::v(V::loadu(a + i - V::kLanes), V::loadu(b + i - V::kLanes)));
+  for (; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
+}
+
+struct WindowOffsets {
+  template <int N, typename T, typename Op>
+  static constexpr auto get() { return &windowOffsetsFixed<N, T, Op>; }
+};
+
+// The same for 1 <= count <= 15 (one kernel per count).
+template <typename T, typename Op>
+void windowOffsets(const T* src, T* out, int n, const int* offsets, int count) {
+  CountTableTo<WindowOffsets, T, Op, 15>::kernel[count](src, out, n, offsets);
+}
+
+// Generic window of K pixels over `pixels` source pixels (K <= pixels):
+// writes the pixels - K + 1 window results to out[shift..] (elements).
+// Windows of 4, 16, 64, ... pixels are built in `temp` (pixels - 1 pixels of
+// room, distinct from out), then at most nine of them, the last overlapping,
+// make each result. Without a temp row the windows are built in place in out
+// (doubling) and moved.
+template <typename T, typename Op>
+void windowDoubling(const T* src, T* out, int pixels, int K, int channels, int shift, T* temp) {
+  const int c = channels, n = (pixels - K + 1) * c;
+  int offsets[10];
+  if (K <= 8 && !(temp && K >= 6)) {
+    for (int k = 0; k < K; ++k) offsets[k] = k * c;
+    windowOffsets<T, Op>(src, out + shift, n, offsets, K);
+    return;
+  }
+  if (temp) {
+    windowFixed<4, T, Op>(src, temp, (pixels - 3) * c, c);
+    int t = 4;
+    for (; K / t > 8; t *= 4) windowFixed<4, T, Op>(temp, temp, (pixels - 4 * t + 1) * c, t * c);
+    int count = 0;
+    for (int k = 0; k + t <= K; k += t) offsets[count++] = k * c;
+    if (K % t) offsets[count++] = (K - t) * c;
+    windowOffsets<T, Op>(temp, out + shift, n, offsets, count);
+    return;
+  }
+  windowFixed<4, T, Op>(src, out, (pixels - 3) * c, c);
+  int t = 4;
+  for (; 4 * t <= K; t *= 4) windowFixed<4, T, Op>(out, out, (pixels - 4 * t + 1) * c, t * c);
+  for (; 2 * t <= K; t *= 2) windowFixed<2, T, Op>(out, out, (pixels - 2 * t + 1) * c, t * c);
+  const int d = (K - t) * c;  // the second window's offset
+  if (d == 0) {
+    if (shift) memmove(out + shift, out, sizeof(T) * size_t(n));
+  } else if (shift == 0) {
+    combineForward<T, Op>(out, out, out + d, n);
+  } else if (d <= shift) {
+    combineBackward<T, Op>(out + shift, out, out + d, n);
+  } else {
+    combineForward<T, Op>(out, out, out + d, n);
+    memmove(out + shift, out, sizeof(T) * size_t(n));
+  }
+}
+
+// One row of the horizontal pass: out[x] = op over src[clamp(x + s + k)],
+// with one kernel per width 1..15 on rows at least twice the width (widths of
+// six or more go through four-pixel windows when a scratch row is given) and
+// the generic kernel otherwise;
+// k < K, x < width, clamping to the row (the replicated border). The caller
+// has clipped s and s + K - 1 to [-(width - 1), width - 1]. `temp` (null or a
+// row of `width` pixels other than out) speeds up wide windows.
+template <typename T, typename Op>
+void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* temp = nullptr) {
+  const int c = channels;
+  int xl = s < 0 ? -s : 0;
+  int xr = width - K - s + 1;
+  if (xr > width) xr = width;
+  if (xr < xl) xr = xl;
+  if (xr > xl) {
+    const int n = xr - xl;
+    if (K < 16 && width >= 2 * K && !(temp && K >= 6)) {
+      int offsets[15];
+      for (int k = 0; k < K; ++k) offsets[k] = k * c;
+      windowOffsets<T, Op>(src + (xl + s) * c, out + xl * c, n * c, offsets, K);
+    } else {
+      windowDoubling<T, Op>(src + (xl + s) * c, out, n + K - 1, K, c, xl * c, temp);
+    }
+  }
+  // Windows that reach past a row end: running prefix and suffix extremes.
+  for (int ch = 0; ch < c; ++ch) {
+    int upTo = 0;
+    T run = src[ch];
+    for (int x = 0; x < xl; ++x) {
+      int b = x + s + K - 1;
+      if (b > width - 1) b = width - 1;
+      for (; upTo < b; ++upTo) run = Op::s(run, src[(upTo + 1) * c + ch]);
+      out[x * c + ch] = run;
+    }
+    int from = width - 1;
+    run = src[from * c + ch];
+    for (int x = width - 1; x >= xr; --x) {
+      int a = x + s;
+      if (a < 0) a = 0;
+      for (; from > a; --from) run = Op::s(run, src[(from - 1) * c + ch]);
+      out[x * c + ch] = run;
+    }
+  }
+}
+
+// out[x] = op(in[clamp(x + a)], in[clamp(x + b)]), a <= 0 <= b, clamping to
+// the row: a window row built from a narrower window row of the same row.
+template <typename T, typename Op>
+void windowFromTwo(const T* in, T* out, int width, int c, int a, int b) {
+  const int x0 = -a < width ? -a : width;
+  const int x1 = width - b > x0 ? width - b : x0;
+  combineForward<T, Op>(out + x0 * c, in + (x0 + a) * c, in + (x0 + b) * c, (x1 - x0) * c);
+  auto clamp = [&](int i) { return i < 0 ? 0 : (i >= width ? width - 1 : i); };
+  auto edge = [&](int from, int to) {
+    for (int x = from; x < to; ++x)
+      for (int ch = 0; ch < c; ++ch) out[x * c + ch] = Op::s(in[clamp(x + a) * c + ch], in[clamp(x + b) * c + ch]);
+  };
+  edge(0, x0);
+  edge(x1, width);
+}
+
+// acc[x] = op(acc[x], row(x + shift)) for x < width (or plain assignment when
+// `first`), where row(p) is roi[p] inside the row, mem[p] beyond an end that
+// is in memory, and the end pixel of roi beyond a replicated end.
+template <typename T, typename Op, bool First>
+void combineShifted(T* acc, int width, int c, const T* roi, const T* mem, bool memLeft, bool memRight,
+                    int shift) {
+  auto segment = [&](int x0, int x1, const T* from) {  // from holds row(x0 + shift)
+    if (x1 <= x0) return;
+    const int n = (x1 - x0) * c;
+    if (First)
+      memcpy(acc + x0 * c, from, sizeof(T) * size_t(n));
+    else
+      combineForward<T, Op>(acc + x0 * c, acc + x0 * c, from, n);
+  };
+  auto edge = [&](int x0, int x1, const T* pixel) {
+    for (int x = x0; x < x1; ++x)
+      for (int ch = 0; ch < c; ++ch) acc[x * c + ch] = First ? pixel[ch] : Op::s(acc[x * c + ch], pixel[ch]);
+  };
+  const int leftEnd = shift < 0 ? (-shift < width ? -shift : width) : 0;
+  const int rightStart = width - shift < leftEnd ? leftEnd : (width - shift < width ? width - shift : width);
+  if (memLeft)
+    segment(0, leftEnd, mem + shift * c);
+  else
+    edge(0, leftEnd, roi);
+  segment(leftEnd, rightStart, roi + (leftEnd + shift) * c);
+  if (memRight)
+    segment(rightStart, width, mem + (rightStart + shift) * c);
+  else
+    edge(rightStart, width, roi + (width - 1) * c);
+}
+
+}  // namespace minmax
+}  // namespace zelcv
+
+#endif  // ZELCV_KERNELS_MINMAX_H
