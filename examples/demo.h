@@ -25,6 +25,8 @@ int demoCheck(const char* what, ZelStatus status);
 /* Family steps. */
 int demoCanny(const DemoImage* image, const char* outDir);
 int demoIntegral(const DemoImage* image, const char* outDir);
+int demoArith(const DemoImage* image, const char* outDir);
+int demoFilter(const DemoImage* image, const char* outDir);
 int demoMorph(const DemoImage* image, const char* outDir);
 int demoMorphAdv(const DemoImage* image, const char* outDir);
 

@@ -27,8 +27,10 @@ int main(int argc, char** argv) {
   int failures = demoWritePgm(outDir, "input.pgm", image.pixels, image.step, image.width,
                               image.height);
   /* Family steps go here, one call each. */
+  failures |= demoArith(&image, outDir);
   failures |= demoCanny(&image, outDir);
   failures |= demoIntegral(&image, outDir);
+  failures |= demoFilter(&image, outDir);
   failures |= demoMorph(&image, outDir);
   failures |= demoMorphAdv(&image, outDir);
   demoFreeImage(&image);

@@ -87,7 +87,12 @@ enum {
 /* Low four bits: the kind of border. Bits 4..7: per-side flags saying that
  * the pixels beyond that side exist in memory and are read from there; a flag
  * overrides the kind on its side only, and zelBorderInMemory is the same as
- * all four flags. Each operation documents which kinds it accepts. */
+ * all four flags. Each operation documents which kinds it accepts, and
+ * validates only the kind (value & 0x0F) when it accepts flags.
+ * Mirror kinds on a row shorter than the reach of a kernel keep reflecting
+ * between the two ends; on a row of width 1 both mirror kinds repeat pixel 0.
+ * Kind 5 is not a border kind. A constant border of a multi-channel image
+ * takes one value per channel. */
 typedef int32_t ZeliBorderType;
 enum {
   zelBorderConstant = 0,       /* the caller's border value */
@@ -145,8 +150,175 @@ ZELCV_API ZelStatus zeliPyramidLayerUpFree_32f_C1R(ZeliPyramidLayerState* state)
 ZELCV_API ZelStatus zeliPyramidLayerUpFree_32f_C3R(ZeliPyramidLayerState* state);
 
 /* ---- Accumulation and absolute differences ---------------------------- */
+/* A 32f accumulator image (srcDst) is updated from 8u, 8s, 16u or 32f sources,
+ * pixel by pixel in single precision, each operation rounded as written:
+ *   Add          a = a + s
+ *   AddSquare    a = a + s * s
+ *   AddProduct   a = a + s1 * s2
+ *   AddWeighted  a = (s - a) * alpha + a   (alpha is not range-checked)
+ * AddWeighted_32f_C1R writes dst = (src1 - src2) * alpha + src2.
+ * Masked (M) variants update only pixels whose 8u mask byte is non-zero and
+ * leave the others bit-identical. AbsDiff writes |src1 - src2| and AbsDiffC
+ * |src - value|; for 8u and 16u the value is first clamped to the type's range,
+ * for 32f the result is the difference with its sign bit cleared.
+ * AbsDiff_8u_C3R is the one-channel operation over 3 x width elements.
+ *
+ * Several of these functions ask zelGetMaxCacheSizeB on every call and write
+ * with non-temporal stores (followed by a store fence) when the bytes that the
+ * call touches are not below the reported cache size, or when the query fails.
+ * The results are identical either way. */
+ZELCV_API ZelStatus zeliAdd_8u32f_C1IR(const Zel8u* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAdd_8s32f_C1IR(const Zel8s* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAdd_16u32f_C1IR(const Zel16u* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAdd_8u32f_C1IMR(const Zel8u* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAdd_8s32f_C1IMR(const Zel8s* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAdd_16u32f_C1IMR(const Zel16u* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAdd_32f_C1IMR(const Zel32f* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+
+ZELCV_API ZelStatus zeliAddSquare_8u32f_C1IR(const Zel8u* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddSquare_8s32f_C1IR(const Zel8s* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddSquare_16u32f_C1IR(const Zel16u* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddSquare_32f_C1IR(const Zel32f* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddSquare_8u32f_C1IMR(const Zel8u* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddSquare_8s32f_C1IMR(const Zel8s* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddSquare_16u32f_C1IMR(const Zel16u* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddSquare_32f_C1IMR(const Zel32f* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+
+ZELCV_API ZelStatus zeliAddProduct_8u32f_C1IR(const Zel8u* src1, int src1Step, const Zel8u* src2, int src2Step, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddProduct_8s32f_C1IR(const Zel8s* src1, int src1Step, const Zel8s* src2, int src2Step, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddProduct_16u32f_C1IR(const Zel16u* src1, int src1Step, const Zel16u* src2, int src2Step, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddProduct_32f_C1IR(const Zel32f* src1, int src1Step, const Zel32f* src2, int src2Step, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddProduct_8u32f_C1IMR(const Zel8u* src1, int src1Step, const Zel8u* src2, int src2Step, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddProduct_8s32f_C1IMR(const Zel8s* src1, int src1Step, const Zel8s* src2, int src2Step, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddProduct_16u32f_C1IMR(const Zel16u* src1, int src1Step, const Zel16u* src2, int src2Step, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAddProduct_32f_C1IMR(const Zel32f* src1, int src1Step, const Zel32f* src2, int src2Step, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize);
+
+ZELCV_API ZelStatus zeliAddWeighted_8u32f_C1IR(const Zel8u* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_8s32f_C1IR(const Zel8s* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_16u32f_C1IR(const Zel16u* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_32f_C1IR(const Zel32f* src, int srcStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_8u32f_C1IMR(const Zel8u* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_8s32f_C1IMR(const Zel8s* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_16u32f_C1IMR(const Zel16u* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_32f_C1IMR(const Zel32f* src, int srcStep, const Zel8u* mask, int maskStep, Zel32f* srcDst, int srcDstStep, ZeliSize roiSize, Zel32f alpha);
+ZELCV_API ZelStatus zeliAddWeighted_32f_C1R(const Zel32f* src1, int src1Step, const Zel32f* src2, int src2Step, Zel32f* dst, int dstStep, ZeliSize roiSize, Zel32f alpha);
+
+ZELCV_API ZelStatus zeliAbsDiff_8u_C1R(const Zel8u* src1, int src1Step, const Zel8u* src2, int src2Step, Zel8u* dst, int dstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAbsDiff_8u_C3R(const Zel8u* src1, int src1Step, const Zel8u* src2, int src2Step, Zel8u* dst, int dstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAbsDiff_16u_C1R(const Zel16u* src1, int src1Step, const Zel16u* src2, int src2Step, Zel16u* dst, int dstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAbsDiff_32f_C1R(const Zel32f* src1, int src1Step, const Zel32f* src2, int src2Step, Zel32f* dst, int dstStep, ZeliSize roiSize);
+ZELCV_API ZelStatus zeliAbsDiffC_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, ZeliSize roiSize, int value);
+ZELCV_API ZelStatus zeliAbsDiffC_16u_C1R(const Zel16u* src, int srcStep, Zel16u* dst, int dstStep, ZeliSize roiSize, int value);
+ZELCV_API ZelStatus zeliAbsDiffC_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize, Zel32f value);
 
 /* ---- Separable filter pipeline ----------------------------------------- */
+/* A separable filter in two passes over rows held by the caller.
+ *
+ * Row pass: row y of the source ROI is filtered horizontally into dst[y]:
+ *   dst[y][x] = convert(sum_k kernel[k] * s(x - xAnchor + k) / divisor)
+ * (taps not reversed). Positions outside the row come from borderType, which
+ * must be exactly zelBorderConstant, zelBorderReplicate or zelBorderInMemory
+ * (no side flags; anything else gives zelStatusBadArgument, -5). Integer
+ * members scale each tap by 1/divisor (single precision), sum in single
+ * precision in tap order, clamp to the result type and truncate toward zero.
+ * The _Low members sum integer products in 32 bits and apply
+ * r = trunc(16384/divisor) as (sum * r) >> 14 (the shift is exact, no 32-bit
+ * wrap of the product), saturating; divisor 1 skips r. 32f sums in double
+ * precision and rounds once to single precision. The 16u members take signed
+ * 16-bit taps.
+ *
+ * Column pass: reads kernelSize + height - 1 row pointers src[0], src[1], ...;
+ *   dst(x, y) = convert(sum_k kernel[k] * src[y + k][x] / divisor)
+ * Repeating pointers is how a caller expresses a vertical border. Integer
+ * members sum in single precision and round to nearest (ties to even) at
+ * every pixel; _Low as the row pass; 32f sums in single precision.
+ *
+ * Row checks, first failure wins: src, dst, kernel or buffer null (-8);
+ * width or height < 1 (-6); any dst[0 .. height-1] null (-8); C3 members: a
+ * null borderValue array (-8, whatever the border); kernelSize < 1 (-6);
+ * xAnchor outside 0 .. kernelSize-1 (-34); srcStep below the row bytes
+ * (-14); 16-bit srcStep odd or 32f srcStep not a multiple of 4 (-108);
+ * borderType (-5); divisor: 0 refused (-5) by 16s, 8u16s_C3R and _Low, < 1
+ * refused by 16u, not checked by 8u16s_C1R (a zero divisor then yields the
+ * clamp limits).
+ * Column checks: src, dst or kernel null (-8); width or height < 1 (-6); any
+ * src[0 .. kernelSize+height-2] null (-8, before kernelSize is validated);
+ * kernelSize < 1 (-6); dstStep (-14, -108); buffer null (-8); integer
+ * members: divisor 0 (-5).
+ *
+ * Work buffers: the sizes that the GetBufferSize queries report (any
+ * alignment). A query whose size would not fit in an int gives
+ * zelStatusBadSize. */
+#define ZELI_ROW_PIPELINE(suffix, S, D, Tap, Value)                                            \
+  ZELCV_API ZelStatus zeliFilterRowBorderPipeline_##suffix(                                   \
+      const S* src, int srcStep, D** dst, ZeliSize roiSize, const Tap* kernel, int kernelSize, \
+      int xAnchor, ZeliBorderType borderType, Value borderValue, int divisor, Zel8u* buffer);
+ZELI_ROW_PIPELINE(16s_C1R, Zel16s, Zel16s, Zel16s, Zel16s)
+ZELI_ROW_PIPELINE(16s_C3R, Zel16s, Zel16s, Zel16s, const Zel16s*)
+ZELI_ROW_PIPELINE(16u_C1R, Zel16u, Zel16u, Zel16s, Zel16u)
+ZELI_ROW_PIPELINE(16u_C3R, Zel16u, Zel16u, Zel16s, const Zel16u*)
+ZELI_ROW_PIPELINE(8u16s_C1R, Zel8u, Zel16s, Zel16s, Zel8u)
+ZELI_ROW_PIPELINE(8u16s_C3R, Zel8u, Zel16s, Zel16s, const Zel8u*)
+ZELI_ROW_PIPELINE(Low_16s_C1R, Zel16s, Zel16s, Zel16s, Zel16s)
+ZELI_ROW_PIPELINE(Low_16s_C3R, Zel16s, Zel16s, Zel16s, const Zel16s*)
+#undef ZELI_ROW_PIPELINE
+ZELCV_API ZelStatus zeliFilterRowBorderPipeline_32f_C1R(
+    const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize roiSize, const Zel32f* kernel,
+    int kernelSize, int xAnchor, ZeliBorderType borderType, Zel32f borderValue, Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterRowBorderPipeline_32f_C3R(
+    const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize roiSize, const Zel32f* kernel,
+    int kernelSize, int xAnchor, ZeliBorderType borderType, const Zel32f* borderValue,
+    Zel8u* buffer);
+
+#define ZELI_COLUMN_PIPELINE(suffix, S, D, Tap)                                             \
+  ZELCV_API ZelStatus zeliFilterColumnPipeline_##suffix(const S** src, D* dst, int dstStep, \
+                                                        ZeliSize roiSize, const Tap* kernel, \
+                                                        int kernelSize, int divisor, Zel8u* buffer);
+ZELI_COLUMN_PIPELINE(16s_C1R, Zel16s, Zel16s, Zel16s)
+ZELI_COLUMN_PIPELINE(16s_C3R, Zel16s, Zel16s, Zel16s)
+ZELI_COLUMN_PIPELINE(16s8s_C1R, Zel16s, Zel8s, Zel16s)
+ZELI_COLUMN_PIPELINE(16s8s_C3R, Zel16s, Zel8s, Zel16s)
+ZELI_COLUMN_PIPELINE(16s8u_C1R, Zel16s, Zel8u, Zel16s)
+ZELI_COLUMN_PIPELINE(16s8u_C3R, Zel16s, Zel8u, Zel16s)
+ZELI_COLUMN_PIPELINE(16u_C1R, Zel16u, Zel16u, Zel16s)
+ZELI_COLUMN_PIPELINE(16u_C3R, Zel16u, Zel16u, Zel16s)
+ZELI_COLUMN_PIPELINE(Low_16s_C1R, Zel16s, Zel16s, Zel16s)
+ZELI_COLUMN_PIPELINE(Low_16s_C3R, Zel16s, Zel16s, Zel16s)
+#undef ZELI_COLUMN_PIPELINE
+ZELCV_API ZelStatus zeliFilterColumnPipeline_32f_C1R(const Zel32f** src, Zel32f* dst, int dstStep,
+                                                     ZeliSize roiSize, const Zel32f* kernel,
+                                                     int kernelSize, Zel8u* buffer);
+ZELCV_API ZelStatus zeliFilterColumnPipeline_32f_C3R(const Zel32f** src, Zel32f* dst, int dstStep,
+                                                     ZeliSize roiSize, const Zel32f* kernel,
+                                                     int kernelSize, Zel8u* buffer);
+
+/* Work-buffer sizes: the row sizes depend on kernelSize only, the column
+ * sizes on the width only. */
+#define ZELI_PIPELINE_QUERY(name) \
+  ZELCV_API ZelStatus name(ZeliSize roiSize, int kernelSize, int* bufferSize);
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_16s_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_16s_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_16u_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_16u_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_32f_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_32f_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_8u16s_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_8u16s_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_Low_16s_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterRowBorderPipelineGetBufferSize_Low_16s_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16s_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16s_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16s8s_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16s8s_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16s8u_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16s8u_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16u_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_16u_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_32f_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_32f_C3R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_Low_16s_C1R)
+ZELI_PIPELINE_QUERY(zeliFilterColumnPipelineGetBufferSize_Low_16s_C3R)
+#undef ZELI_PIPELINE_QUERY
 
 /* ---- Canny edge detector ----------------------------------------------- */
 /* Edge map: 255 on edge pixels, 0 elsewhere. The magnitude is thinned along

@@ -91,8 +91,12 @@ extern "C" {
 
 int zelGetMaxCacheSizeB(int* bytes) {
   if (!bytes) return zelCoreStatusNullPointer;
-  long size = largestCacheFromOs();
-  if (size <= 0) size = largestCacheFromCpuid();
+  // The caches do not change while the process runs, and callers ask on
+  // every call of a streaming function: look them up once.
+  static const long size = [] {
+    long fromOs = largestCacheFromOs();
+    return fromOs > 0 ? fromOs : largestCacheFromCpuid();
+  }();
   if (size <= 0) return zelCoreStatusNoCacheInfo;
   *bytes = size > 0x7FFFFFFFL ? 0x7FFFFFFF : static_cast<int>(size);
   return zelCoreStatusOk;
