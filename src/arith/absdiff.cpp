@@ -3,6 +3,7 @@
 #include <limits>
 
 #include "arith/store_mode.h"
+#include "core/load.h"
 #include "core/status.h"
 #include "kernels/absdiff.h"
 
@@ -15,6 +16,14 @@ StoreMode storeMode(int bytesPerPixel, ZeliSize roi) {
   return bytesPerPixel ? chooseStoreMode(bytesPerPixel, roi) : StoreMode::Ordinary;
 }
 
+template <typename T>
+void run(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, int height) {
+  if (useAvx2Kernels())
+    absdiff::run<T, avx2::Isa>(mode, src1, src2, c, dst, width, height);
+  else
+    absdiff::run<T, simd::Sse2>(mode, src1, src2, c, dst, width, height);
+}
+
 // |src1 - src2| over `channels` interleaved channels, run as one channel over
 // channels x width elements (the checks see the same row bytes).
 template <typename T>
@@ -23,7 +32,7 @@ ZelStatus difference(const T* src1, int src1Step, const T* src2, int src2Step, T
   if (ZelStatus s = checkImages(
           {image(src1, src1Step, channels), image(src2, src2Step, channels), image(dst, dstStep, channels)}, roi))
     return s;
-  absdiff::run<T>(storeMode(bytesPerPixel, roi), {src1, src1Step}, {src2, src2Step}, T(), {dst, dstStep},
+  run<T>(storeMode(bytesPerPixel, roi), {src1, src1Step}, {src2, src2Step}, T(), {dst, dstStep},
                   roi.width * channels, roi.height);
   return zelStatusOk;
 }
@@ -33,7 +42,7 @@ template <typename T>
 ZelStatus differenceFromConstant(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, T c,
                                  int bytesPerPixel) {
   if (ZelStatus s = checkImages({image(src, srcStep), image(dst, dstStep)}, roi)) return s;
-  absdiff::run<T>(storeMode(bytesPerPixel, roi), {src, srcStep}, {nullptr, 0}, c, {dst, dstStep}, roi.width,
+  run<T>(storeMode(bytesPerPixel, roi), {src, srcStep}, {nullptr, 0}, c, {dst, dstStep}, roi.width,
                   roi.height);
   return zelStatusOk;
 }

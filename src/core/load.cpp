@@ -6,16 +6,24 @@ namespace zelcv {
 
 namespace {
 int gCpuFeatureFlag = 0;
-constexpr uint32_t kFlagFeatures = 0x10u | 0x20u;
+bool gAvx2Kernels = false;
+constexpr uint32_t kFlagFeatures = zelCpuSSSE3 | zelCpuSSE41;
+// zelcore reports AVX and AVX2 only where the OS saves the wide registers.
+constexpr uint32_t kAvx2Features = zelCpuAVX | zelCpuAVX2;
 }  // namespace
 
 int onLibraryLoad(void* /*module*/, uint32_t reason, void* /*reserved*/) {
-  if (reason == kProcessAttach)
-    gCpuFeatureFlag = (zelGetEnabledCpuFeatures() & kFlagFeatures) == kFlagFeatures ? 1 : 0;
+  if (reason == kProcessAttach) {
+    const uint32_t features = zelGetEnabledCpuFeatures();
+    gCpuFeatureFlag = (features & kFlagFeatures) == kFlagFeatures ? 1 : 0;
+    gAvx2Kernels = (features & kAvx2Features) == kAvx2Features;
+  }
   return 1;
 }
 
 int cpuFeatureFlag() { return gCpuFeatureFlag; }
+
+bool useAvx2Kernels() { return gAvx2Kernels; }
 
 }  // namespace zelcv
 

@@ -11,18 +11,18 @@
 #include "kernels/simd.h"
 
 namespace zelcv {
+namespace avx2 {
+struct Isa;
+}
 namespace absdiff {
 
-template <typename T> struct Ops;
-
-template <> struct Ops<uint8_t> {
-  static uint8_t one(uint8_t a, uint8_t b) { return uint8_t(a > b ? a - b : b - a); }
-  static __m128i vec(__m128i a, __m128i b) { return _mm_or_si128(_mm_subs_epu8(a, b), _mm_subs_epu8(b, a)); }
-};
-
-template <> struct Ops<uint16_t> {
-  static uint16_t one(uint16_t a, uint16_t b) { return uint16_t(a > b ? a - b : b - a); }
-  static __m128i vec(__m128i a, __m128i b) { return _mm_or_si128(_mm_subs_epu16(a, b), _mm_subs_epu16(b, a)); }
+// The scalar form, and the vector form for any instruction set's vectors.
+template <typename T> struct Ops {
+  static T one(T a, T b) { return T(a > b ? a - b : b - a); }
+  template <typename V>
+  static typename V::Raw vec(typename V::Raw a, typename V::Raw b) {
+    return V::bitOr(V::subs(a, b), V::subs(b, a));
+  }
 };
 
 template <> struct Ops<float> {
@@ -34,17 +34,22 @@ template <> struct Ops<float> {
     memcpy(&d, &bits, 4);
     return d;
   }
-  static __m128 vec(__m128 a, __m128 b) { return _mm_andnot_ps(_mm_set1_ps(-0.0f), _mm_sub_ps(a, b)); }
+  template <typename V>
+  static typename V::Raw vec(typename V::Raw a, typename V::Raw b) {
+    return V::abs(V::sub(a, b));
+  }
 };
 
 // One row: src2 is a second image, or null with the constant c used instead.
-template <typename T, bool kConstant>
+template <typename T, bool kConstant, typename Isa>
 class Row {
-  using V = simd::Vec<T>;
+  using V = simd::Vec<T, Isa>;
+  using Part = simd::Vec<T>;  // 16 bytes whatever the block width
 
  public:
-  static constexpr int kPart = simd::kBytes / int(sizeof(T));  // one vector
-  static constexpr int kBlock = 4 * kPart;
+  static constexpr int kPart = Part::kLanes;
+  static constexpr int kBlock = 4 * V::kLanes;
+  static constexpr int kBlockAlign = Isa::kBytes;
 
   Row(const T* src1, const T* src2, T c, T* out) : src1_(src1), src2_(src2), c_(c), out_(out) {}
 
@@ -57,16 +62,16 @@ class Row {
     // All loads first, so that the four independent results overlap.
     typename V::Raw a[4], b[4];
     for (int i = 0; i < 4; ++i) {
-      a[i] = V::loadu(src1_ + x + i * kPart);
-      b[i] = kConstant ? V::set1(c_) : V::loadu(src2_ + x + i * kPart);
+      a[i] = V::loadu(src1_ + x + i * V::kLanes);
+      b[i] = kConstant ? V::set1(c_) : V::loadu(src2_ + x + i * V::kLanes);
     }
-    for (int i = 0; i < 4; ++i) simd::put<M, V>(out_ + x + i * kPart, Ops<T>::vec(a[i], b[i]));
+    for (int i = 0; i < 4; ++i) simd::put<M, V>(out_ + x + i * V::kLanes, Ops<T>::template vec<V>(a[i], b[i]));
   }
 
   template <StoreMode M>
   void part(int x) {
-    typename V::Raw b = kConstant ? V::set1(c_) : V::loadu(src2_ + x);
-    simd::put<M, V>(out_ + x, Ops<T>::vec(V::loadu(src1_ + x), b));
+    typename Part::Raw b = kConstant ? Part::set1(c_) : Part::loadu(src2_ + x);
+    simd::put<M, Part>(out_ + x, Ops<T>::template vec<Part>(Part::loadu(src1_ + x), b));
   }
 
  private:
@@ -77,15 +82,24 @@ class Row {
 };
 
 // |src1 - src2| (src2.data non-null) or |src1 - c| over width x height.
-template <typename T>
+template <typename T, typename Isa>
 void run(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, int height) {
   if (src2.data) {
     driveRows(mode, width, height,
-              [&](int y) { return Row<T, false>(src1.row(y), src2.row(y), c, dst.row(y)); });
+              [&](int y) { return Row<T, false, Isa>(src1.row(y), src2.row(y), c, dst.row(y)); });
   } else {
-    driveRows(mode, width, height, [&](int y) { return Row<T, true>(src1.row(y), nullptr, c, dst.row(y)); });
+    driveRows(mode, width, height,
+              [&](int y) { return Row<T, true, Isa>(src1.row(y), nullptr, c, dst.row(y)); });
   }
 }
+
+#define ZELCV_ABSDIFF_RUN(T, Isa)                                                                         \
+  void run<T, Isa>(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, \
+                   int height)
+// Built in absdiff_avx2.cpp.
+extern template ZELCV_ABSDIFF_RUN(uint8_t, avx2::Isa);
+extern template ZELCV_ABSDIFF_RUN(uint16_t, avx2::Isa);
+extern template ZELCV_ABSDIFF_RUN(float, avx2::Isa);
 
 }  // namespace absdiff
 }  // namespace zelcv

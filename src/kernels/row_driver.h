@@ -14,11 +14,17 @@
 //   void one(int x);                 pixel x, ordinary stores
 //   template <StoreMode M> void block(int x);   pixels x .. x + kBlock - 1
 //   template <StoreMode M> void part(int x);    pixels x .. x + kPart - 1
-// block() and part() run only where written() + x is 16-byte aligned.
+//   static constexpr int kBlockAlign;   optional: the alignment in bytes that
+//                                    block() needs (16 when absent); parts
+//                                    run until it is reached. A row with
+//                                    kBlockAlign above 16 has 16-byte parts.
+// block() and part() run only where written() + x is 16-byte aligned, and
+// block() only where it is kBlockAlign-aligned.
 #ifndef ZELCV_KERNELS_ROW_DRIVER_H
 #define ZELCV_KERNELS_ROW_DRIVER_H
 
 #include <stddef.h>
+#include <stdint.h>
 
 #include <type_traits>
 
@@ -44,6 +50,16 @@ inline void put(void* p, typename V::Raw v) {
 
 }  // namespace simd
 
+// The alignment a row type's blocks need.
+template <typename Row, typename = void>
+struct BlockAlignment {
+  static constexpr int value = simd::kBytes;
+};
+template <typename Row>
+struct BlockAlignment<Row, std::void_t<decltype(Row::kBlockAlign)>> {
+  static constexpr int value = Row::kBlockAlign;
+};
+
 // Runs `makeRow(y)` for each of `height` rows of `width` pixels.
 template <StoreMode M, typename MakeRow>
 inline void driveRows(int width, int height, MakeRow makeRow) {
@@ -52,10 +68,19 @@ inline void driveRows(int width, int height, MakeRow makeRow) {
     using Row = decltype(row);
     static_assert(Row::kBlock % Row::kPart == 0, "a block is a whole number of parts");
     static_assert(sizeof(*row.written()) * Row::kPart % simd::kBytes == 0, "parts keep the alignment");
+    constexpr int kBlockAlign = BlockAlignment<Row>::value;
+    static_assert(kBlockAlign == simd::kBytes || sizeof(*row.written()) * Row::kPart == simd::kBytes,
+                  "parts can reach the block alignment");
     const int head = simd::elementsToAlignment(row.written(), width);
     int x = 0;
     for (; x < head; ++x) row.one(x);
     if (head < width) {
+      if constexpr (kBlockAlign != simd::kBytes) {
+        while (x <= width - Row::kPart && reinterpret_cast<uintptr_t>(row.written() + x) % kBlockAlign != 0) {
+          row.template part<M>(x);
+          x += Row::kPart;
+        }
+      }
       for (; x <= width - Row::kBlock; x += Row::kBlock) row.template block<M>(x);
       for (; x <= width - Row::kPart; x += Row::kPart) row.template part<M>(x);
     }

@@ -1,6 +1,8 @@
-// The SIMD abstraction every kernel is written against: 128-bit SSE2 vectors
-// typed by element, so that one template serves 8u, 8s, 16u, 16s, 32s and 32f.
-// SSE2 is the baseline on both x86 targets; nothing here needs more.
+// The SIMD abstraction every kernel is written against: vectors typed by
+// element, so that one template serves 8u, 8s, 16u, 16s, 32s and 32f, and by
+// instruction set, so that one kernel serves every vector width. This file
+// holds the baseline, 128-bit SSE2, which both x86 targets have; the 256-bit
+// AVX2 forms are in simd_avx2.h, compiled only into the *_avx2.cpp files.
 #ifndef ZELCV_KERNELS_SIMD_H
 #define ZELCV_KERNELS_SIMD_H
 
@@ -11,9 +13,16 @@
 namespace zelcv {
 namespace simd {
 
+// The alignment granule of the row driver: heads run to a 16-byte boundary
+// whatever the vector width.
 constexpr int kBytes = 16;
 
-template <typename T> struct Vec;
+// The baseline instruction set.
+struct Sse2 {
+  static constexpr int kBytes = 16;
+};
+
+template <typename T, typename Isa = Sse2> struct Vec;
 
 // Integer vectors share loads and stores.
 struct IntegerVec {
@@ -24,6 +33,7 @@ struct IntegerVec {
   static void store(void* p, Raw v) { _mm_store_si128(static_cast<__m128i*>(p), v); }
   // Non-temporal store; `p` must be 16-byte aligned.
   static void stream(void* p, Raw v) { _mm_stream_si128(static_cast<__m128i*>(p), v); }
+  static Raw bitOr(Raw a, Raw b) { return _mm_or_si128(a, b); }
 };
 
 template <> struct Vec<uint8_t> : IntegerVec {
@@ -31,6 +41,7 @@ template <> struct Vec<uint8_t> : IntegerVec {
   static Raw set1(uint8_t v) { return _mm_set1_epi8(static_cast<char>(v)); }
   static Raw min(Raw a, Raw b) { return _mm_min_epu8(a, b); }
   static Raw max(Raw a, Raw b) { return _mm_max_epu8(a, b); }
+  static Raw subs(Raw a, Raw b) { return _mm_subs_epu8(a, b); }
 };
 
 template <> struct Vec<int8_t> : IntegerVec {
@@ -55,6 +66,7 @@ template <> struct Vec<uint16_t> : IntegerVec {
   // SSE2 has only signed 16-bit min/max: a - sat(a - b) and b + sat(a - b).
   static Raw min(Raw a, Raw b) { return _mm_sub_epi16(a, _mm_subs_epu16(a, b)); }
   static Raw max(Raw a, Raw b) { return _mm_add_epi16(b, _mm_subs_epu16(a, b)); }
+  static Raw subs(Raw a, Raw b) { return _mm_subs_epu16(a, b); }
 };
 
 template <> struct Vec<int32_t> : IntegerVec {
@@ -81,6 +93,11 @@ template <> struct Vec<float> {
   static Raw set1(float v) { return _mm_set1_ps(v); }
   static Raw min(Raw a, Raw b) { return _mm_min_ps(a, b); }
   static Raw max(Raw a, Raw b) { return _mm_max_ps(a, b); }
+  static Raw add(Raw a, Raw b) { return _mm_add_ps(a, b); }
+  static Raw sub(Raw a, Raw b) { return _mm_sub_ps(a, b); }
+  static Raw mul(Raw a, Raw b) { return _mm_mul_ps(a, b); }
+  // The sign bit cleared.
+  static Raw abs(Raw a) { return _mm_andnot_ps(_mm_set1_ps(-0.0f), a); }
 };
 
 // Elements to process one by one before `p` reaches a 16-byte boundary

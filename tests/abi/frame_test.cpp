@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cstdlib>
 #include <cstring>
 #include <map>
 #include <string>
@@ -117,6 +118,16 @@ TEST(FaultInjection, InterposesTheSupportLibrary) {
   EXPECT_EQ(zelGetMaxCacheSizeB(&bytes), 0);
   EXPECT_EQ(bytes, 4096);
   EXPECT_EQ(faults.cacheQueries(), 2);
+}
+
+// The library chooses its kernels from the features it sees at load: the
+// interposed query must be the one it called, or a run meant for the
+// baseline kernels would test the AVX2 ones again.
+TEST(FaultInjection, ReachesTheLoadRoutine) {
+  EXPECT_GE(zeltest::cpuFeatureQueriesSinceStart(), 1);
+  if (const char* keep = std::getenv("ZELTEST_CPU_FEATURES")) {
+    EXPECT_EQ(zelGetEnabledCpuFeatures() & ~uint32_t(std::strtoul(keep, nullptr, 0)), 0u);
+  }
 }
 
 }  // namespace

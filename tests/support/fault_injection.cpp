@@ -14,6 +14,9 @@ struct Injection {
   bool cacheOverride = false;
   int cacheStatus = 0;
   int cacheBytes = 0;
+  bool featureOverride = false;
+  uint32_t features = 0;
+  int featureQueries = 0;
   int allocations = 0;
   int releases = 0;
   int live = 0;
@@ -22,6 +25,7 @@ struct Injection {
   void* lastRelease = nullptr;
 };
 Injection gInjection;
+int gFeatureQueriesSinceStart = 0;
 
 template <typename F>
 F realFunction(const char* name) {
@@ -63,6 +67,16 @@ int zelGetMaxCacheSizeB(int* bytes) {
   return gInjection.cacheStatus;
 }
 
+uint32_t zelGetEnabledCpuFeatures(void) {
+  static auto real = realFunction<uint32_t (*)(void)>("zelGetEnabledCpuFeatures");
+  ++gFeatureQueriesSinceStart;
+  if (gInjection.active) ++gInjection.featureQueries;
+  if (gInjection.active && gInjection.featureOverride) return gInjection.features;
+  uint32_t mask = real();
+  if (const char* keep = std::getenv("ZELTEST_CPU_FEATURES")) mask &= uint32_t(std::strtoul(keep, nullptr, 0));
+  return mask;
+}
+
 }  // extern "C"
 
 namespace zeltest {
@@ -79,6 +93,12 @@ void FaultInjection::setCacheAnswer(int status, int bytes) {
   gInjection.cacheStatus = status;
   gInjection.cacheBytes = bytes;
 }
+void FaultInjection::setCpuFeatures(uint32_t mask) {
+  gInjection.featureOverride = true;
+  gInjection.features = mask;
+}
+int FaultInjection::cpuFeatureQueries() const { return gInjection.featureQueries; }
+int cpuFeatureQueriesSinceStart() { return gFeatureQueriesSinceStart; }
 int FaultInjection::allocations() const { return gInjection.allocations; }
 int FaultInjection::releases() const { return gInjection.releases; }
 int FaultInjection::liveBlocks() const { return gInjection.live; }

@@ -101,36 +101,34 @@ TEST(Allocation, AlignUpPlacesInsideTheBlock) {
 
 }  // namespace
 
-// The load routine queries the processor features itself; this definition
-// interposes the support library's so each mask can be tried.
-static uint32_t gFeatureAnswer = 0;
-static int gFeatureQueries = 0;
-extern "C" uint32_t zelGetEnabledCpuFeatures(void) {
-  ++gFeatureQueries;
-  return gFeatureAnswer;
-}
-
 namespace {
 
 TEST(LoadRoutine, ActsOnProcessAttachOnlyAndAlwaysSucceeds) {
   struct Case {
     uint32_t mask;
     int flag;
-  } cases[] = {{0x30, 1}, {0xFFFFFFFF, 1}, {0x10, 0}, {0x20, 0}, {0, 0}, {0x3F, 1}};
+    bool avx2;
+  } cases[] = {{0x30, 1, false}, {0xFFFFFFFF, 1, true}, {0x10, 0, false}, {0x20, 0, false},
+               {0, 0, false},    {0x3F, 1, false},      {0x500, 0, true},  {0x400, 0, false},
+               {0x100, 0, false}};
   for (const Case& c : cases) {
-    gFeatureAnswer = c.mask;
-    gFeatureQueries = 0;
+    zeltest::FaultInjection faults;
+    faults.setCpuFeatures(c.mask);
     EXPECT_EQ(zelcv::onLibraryLoad(nullptr, zelcv::kProcessAttach, nullptr), 1);
-    EXPECT_EQ(gFeatureQueries, 1);
+    EXPECT_EQ(faults.cpuFeatureQueries(), 1);
     EXPECT_EQ(zelcv::cpuFeatureFlag(), c.flag) << std::hex << c.mask;
-    // Every other reason leaves the flag and makes no query.
-    gFeatureAnswer = c.flag ? 0 : 0x30;
+    EXPECT_EQ(zelcv::useAvx2Kernels(), c.avx2) << std::hex << c.mask;
+    // Every other reason leaves the choices and makes no query.
+    faults.setCpuFeatures(~c.mask);
     for (uint32_t reason : {0u, 2u, 3u, 4u, 99u}) {
       EXPECT_EQ(zelcv::onLibraryLoad(nullptr, reason, nullptr), 1);
       EXPECT_EQ(zelcv::cpuFeatureFlag(), c.flag);
+      EXPECT_EQ(zelcv::useAvx2Kernels(), c.avx2);
     }
-    EXPECT_EQ(gFeatureQueries, 1);
+    EXPECT_EQ(faults.cpuFeatureQueries(), 1);
   }
+  // Back to what this processor has, for the tests that follow.
+  zelcv::onLibraryLoad(nullptr, zelcv::kProcessAttach, nullptr);
 }
 
 }  // namespace

@@ -1,0 +1,32 @@
+# Fails when an AVX2 object defines a mergeable (weak) symbol that is not its
+# own: the linker keeps one copy of each such symbol, and if it keeps the copy
+# compiled for AVX2, the baseline kernels run AVX2 code on processors without
+# it. Names of the AVX2 files' own code contain "avx2::".
+#   cmake -DNM=<nm> -DOBJECTS=<a|b|c> -P check_avx2_objects.cmake
+string(REPLACE "|" ";" objects "${OBJECTS}")
+set(checked 0)
+set(leaks "")
+foreach(object IN LISTS objects)
+  if(NOT object MATCHES "_avx2\\.cpp\\.o(bj)?$")
+    continue()
+  endif()
+  math(EXPR checked "${checked} + 1")
+  execute_process(COMMAND ${NM} -C --defined-only ${object}
+                  OUTPUT_VARIABLE listing RESULT_VARIABLE status)
+  if(NOT status EQUAL 0)
+    message(FATAL_ERROR "${NM} failed on ${object}")
+  endif()
+  string(REPLACE "\n" ";" lines "${listing}")
+  foreach(line IN LISTS lines)
+    if(line MATCHES "^[0-9a-fA-F]+ [WwVvu] (.*)$" AND NOT CMAKE_MATCH_1 MATCHES "avx2::")
+      string(APPEND leaks "\n  ${object}: ${CMAKE_MATCH_1}")
+    endif()
+  endforeach()
+endforeach()
+if(checked EQUAL 0)
+  message(FATAL_ERROR "no AVX2 objects among the library's objects")
+endif()
+if(leaks)
+  message(FATAL_ERROR "AVX2 objects define shared inline code:${leaks}")
+endif()
+message(STATUS "${checked} AVX2 objects define only their own code")
