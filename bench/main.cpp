@@ -1,5 +1,6 @@
 // zelcv-bench: zelcv against OpenCV on identical inputs, single-threaded.
 //   zelcv-bench [--benchmark_filter=REGEX] [other Google Benchmark flags]
+#include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <cstring>
@@ -62,21 +63,41 @@ struct Result {
   double bytesPerSecond = 0;
 };
 
-// Collects results while printing the usual console lines.
+// Collects results while printing the usual console lines. With
+// --benchmark_repetitions the table uses the median of the repetitions, which
+// is steadier than any single one on a busy machine.
 class PairingReporter : public benchmark::ConsoleReporter {
  public:
   void ReportRuns(const std::vector<Run>& runs) override {
     ConsoleReporter::ReportRuns(runs);
     for (const Run& run : runs) {
-      if (run.run_type != Run::RT_Iteration || run.error_occurred) continue;
+      if (run.error_occurred) continue;
       Result r;
       r.microseconds = run.GetAdjustedRealTime();
       auto bytes = run.counters.find("bytes_per_second");
       if (bytes != run.counters.end()) r.bytesPerSecond = bytes->second;
-      results[run.benchmark_name()] = r;
+      if (run.run_type == Run::RT_Iteration)
+        repetitions[run.run_name.str()].push_back(r);
+      else if (run.aggregate_name == "median")
+        medians[run.run_name.str()] = r;
     }
   }
-  std::map<std::string, Result> results;
+
+  // One result per benchmark: the reported median, or the median repetition.
+  std::map<std::string, Result> results() const {
+    std::map<std::string, Result> out = medians;
+    for (auto [name, runs] : repetitions) {
+      if (out.count(name)) continue;
+      std::sort(runs.begin(), runs.end(),
+                [](const Result& a, const Result& b) { return a.microseconds < b.microseconds; });
+      out[name] = runs[runs.size() / 2];
+    }
+    return out;
+  }
+
+ private:
+  std::map<std::string, std::vector<Result>> repetitions;
+  std::map<std::string, Result> medians;
 };
 
 void printTable(const std::map<std::string, Result>& results) {
@@ -119,7 +140,7 @@ int main(int argc, char** argv) {
   if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 1;
   zelbench::PairingReporter reporter;
   benchmark::RunSpecifiedBenchmarks(&reporter);
-  zelbench::printTable(reporter.results);
+  zelbench::printTable(reporter.results());
   benchmark::Shutdown();
   return 0;
 }
