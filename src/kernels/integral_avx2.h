@@ -92,6 +92,12 @@ inline void finishBlock(const uint16_t* staged, const typename Sum::T* above, ty
 constexpr int kStageAhead = 8;
 constexpr int kRingBlocks = 16;
 
+// Output elements ahead of the block being finished whose lines are fetched
+// for writing (8 KB): a destination that is not in the cache
+// otherwise holds the stores back while each line arrives. Prefetches past
+// the image are harmless.
+constexpr int kWriteAhead = 2048;
+
 template <class Sum>
 void sumRowKernel(Isa, Sum, const uint8_t* src, const typename Sum::T* above, typename Sum::T* out, int w) {
   uint32_t run = 0;
@@ -107,6 +113,9 @@ void sumRowKernel(Isa, Sum, const uint8_t* src, const typename Sum::T* above, ty
     for (; b + kStageAhead < blocks; ++b) {
       stageBlock(src + 32 * (b + kStageAhead), slot(b + kStageAhead));
       finishBlock<Sum>(slot(b), above + 32 * b, out + 32 * b, carry);
+      const uintptr_t ahead = uintptr_t(out + 32 * b) + kWriteAhead * sizeof(typename Sum::T);
+      __builtin_prefetch(reinterpret_cast<const void*>(ahead), 1);
+      __builtin_prefetch(reinterpret_cast<const void*>(ahead + 64), 1);
     }
     for (; b < blocks; ++b) finishBlock<Sum>(slot(b), above + 32 * b, out + 32 * b, carry);
     run = uint32_t(_mm256_cvtsi256_si32(carry));
