@@ -93,9 +93,9 @@ constexpr int kStageAhead = 8;
 constexpr int kRingBlocks = 16;
 
 // Output elements ahead of the block being finished whose lines are fetched
-// for writing (8 KB): a destination that is not in the cache
-// otherwise holds the stores back while each line arrives. Prefetches past
-// the image are harmless.
+// for writing (8 KB): a destination that is not in the cache otherwise holds
+// the stores back while each line arrives. Prefetches past the image are
+// harmless.
 constexpr int kWriteAhead = 2048;
 
 template <class Sum>
