@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <type_traits>
 
+#include "core/load.h"
 #include "detect/integral_checks.h"
 #include "kernels/integral.h"
 
@@ -14,8 +15,8 @@ using integral::Plane32s;
 using integral::Plane64f;
 
 // Fills row 0 and column 0 with the start values, then builds row y + 1 from
-// source row y and row y.
-template <class Sum, class Sq>
+// source row y and row y. Sums-only rows run on the instruction set Isa.
+template <class Sum, class Sq, class Isa>
 void integralImage(const uint8_t* src, int srcStep, typename Sum::T* dst, int dstStep,
                    typename Sq::T* sq, int sqStep, ZeliSize roi, typename Sum::T val,
                    typename Sq::T valSqr) {
@@ -35,8 +36,11 @@ void integralImage(const uint8_t* src, int srcStep, typename Sum::T* dst, int ds
       outSq[0] = valSqr;
       ++outSq;
     }
-    integral::integralRow<Sum, Sq>(rowAt(src, srcStep, y), above + 1, out + 1, aboveSq, outSq, w,
-                                   true);
+    if constexpr (kSquares)
+      integral::integralRow<Sum, Sq>(rowAt(src, srcStep, y), above + 1, out + 1, aboveSq, outSq, w,
+                                     true);
+    else
+      integral::sumRow<Sum, Isa>(rowAt(src, srcStep, y), above + 1, out + 1, w);
   }
 }
 
@@ -44,7 +48,10 @@ template <class Sum>
 ZelStatus plainIntegral(const Zel8u* src, int srcStep, typename Sum::T* dst, int dstStep,
                         ZeliSize roi, typename Sum::T val) {
   if (ZelStatus s = check8uIntegral(src, srcStep, dst, dstStep, roi, 1)) return s;
-  integralImage<Sum, NoPlane>(src, srcStep, dst, dstStep, nullptr, 0, roi, val, 0);
+  if (useAvx2Kernels())
+    integralImage<Sum, NoPlane, avx2::Isa>(src, srcStep, dst, dstStep, nullptr, 0, roi, val, 0);
+  else
+    integralImage<Sum, NoPlane, simd::Sse2>(src, srcStep, dst, dstStep, nullptr, 0, roi, val, 0);
   return zelStatusOk;
 }
 
@@ -53,7 +60,7 @@ ZelStatus sqrIntegral(const Zel8u* src, int srcStep, typename Sum::T* dst, int d
                       typename Sq::T* sqr, int sqrStep, ZeliSize roi, typename Sum::T val,
                       typename Sq::T valSqr) {
   if (ZelStatus s = check8uIntegral(src, srcStep, dst, dstStep, sqr, sqrStep, roi, 1)) return s;
-  integralImage<Sum, Sq>(src, srcStep, dst, dstStep, sqr, sqrStep, roi, val, valSqr);
+  integralImage<Sum, Sq, simd::Sse2>(src, srcStep, dst, dstStep, sqr, sqrStep, roi, val, valSqr);
   return zelStatusOk;
 }
 

@@ -1,7 +1,8 @@
 // Row kernels of the integral images: each builds one output row from the
 // source row and the output row(s) above it. Every kernel has a scalar
 // reference (the definition of the result) and an SSE2 path that must give
-// bit-identical results; the unit tests hold them against each other.
+// bit-identical results; the unit tests hold them against each other. The
+// sums-only rows also have an AVX2 form (integral_avx2.h), chosen per call.
 #ifndef ZELCV_KERNELS_INTEGRAL_H
 #define ZELCV_KERNELS_INTEGRAL_H
 
@@ -11,7 +12,12 @@
 
 #include <type_traits>
 
+#include "kernels/simd.h"
+
 namespace zelcv {
+namespace avx2 {
+struct Isa;
+}
 namespace integral {
 
 // ---- Element conversions shared by both paths ------------------------------
@@ -164,6 +170,27 @@ inline void integralRow(const uint8_t* src, const typename Sum::T* above, typena
     done = integralRowSimd<Sum, Sq>(src, above, out, aboveSq, outSq, 0, w, run, runSq);
   integralRowScalar<Sum, Sq>(src, above, out, aboveSq, outSq, done, w, run, runSq);
 }
+
+// One row of a sums-only integral of an 8u source for the instruction set
+// Isa; the same results bit for bit whichever set runs. The forms per set are
+// overloads of sumRowKernel on the set's tag (the AVX2 one, in namespace avx2,
+// is found through its tag).
+template <class Sum>
+inline void sumRowKernel(simd::Sse2, Sum, const uint8_t* src, const typename Sum::T* above,
+                         typename Sum::T* out, int w) {
+  integralRow<Sum, NoPlane>(src, above, out, nullptr, nullptr, w, true);
+}
+
+template <class Sum, class Isa>
+void sumRow(const uint8_t* src, const typename Sum::T* above, typename Sum::T* out, int w) {
+  sumRowKernel(Isa(), Sum(), src, above, out, w);
+}
+
+#define ZELCV_INTEGRAL_SUM_ROW(Sum, Isa) \
+  void sumRow<Sum, Isa>(const uint8_t* src, const Sum::T* above, Sum::T* out, int w)
+// Built in integral_avx2.cpp.
+extern template ZELCV_INTEGRAL_SUM_ROW(Plane32s, avx2::Isa);
+extern template ZELCV_INTEGRAL_SUM_ROW(Plane32f, avx2::Isa);
 
 // One row of the integral of a 32f source: the running sum is kept in single
 // precision, strictly left to right, so it stays scalar; the addition of the

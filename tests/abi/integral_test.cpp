@@ -100,6 +100,34 @@ TEST(Integral, PlainAndSquaredMatchDirectSums) {
   }
 }
 
+// Sums-only members over rows far wider than the vector blocks and the
+// staging distance of the wide kernels, with ragged tails; bright rows keep
+// every lane near its largest running sum.
+TEST(Integral, WideRowsMatchDirectSums) {
+  std::mt19937 rng(406);
+  for (int w : {31, 32, 33, 63, 69, 255, 256, 257, 288, 511, 512, 545, 1055, 2100, 4099}) {
+    for (bool bright : {false, true}) {
+      SCOPED_TRACE(testing::Message() << "width " << w << (bright ? ", bright" : ""));
+      const int h = std::uniform_int_distribution<int>(1, 4)(rng);
+      TestImage<uint8_t> src = randomSource(rng, w, h, w % 2 == 0, bright ? 240 : 0, 255);
+      PixelSums sums(src, w, h);
+      const int32_t ival = int32_t(rng());
+      const float fval = quarterValue(rng);
+      TestImage<Zel32s> a(exactLayout(rng, w + 1, h + 1, 4, w % 3 == 0));
+      TestImage<Zel32f> f(exactLayout(rng, w + 1, h + 1, 4, w % 3 == 1));
+      fillGarbage(a, rng);
+      fillGarbage(f, rng);
+      ASSERT_EQ(zeliIntegral_8u32s_C1R(src.data(), src.step(), a.data(), a.step(), {w, h}, ival), 0);
+      EXPECT_TRUE(sameBits(a, [&](int x, int y) { return wrap(ival + sums.plain(y, x)); }));
+      ASSERT_EQ(zeliIntegral_8u32f_C1R(src.data(), src.step(), f.data(), f.step(), {w, h}, fval), 0);
+      EXPECT_TRUE(sameBits(f, [&](int x, int y) { return float(double(fval) + double(sums.plain(y, x))); }));
+      EXPECT_TRUE(src.sentinelIntact());
+      EXPECT_TRUE(a.sentinelIntact());
+      EXPECT_TRUE(f.sentinelIntact());
+    }
+  }
+}
+
 // Eighths in [-64, 64]: every partial sum of a 100 x 100 image stays exact in
 // single precision, so the sequential float sum has one right answer.
 TEST(Integral, FloatSourceMatchesDirectSums) {
