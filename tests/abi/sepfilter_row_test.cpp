@@ -114,6 +114,18 @@ TYPED_TEST(RowPipeline, MatchesReferenceForEverySizeAnchorWidthAndBorder) {
         }
 }
 
+// Rows long enough for several vector blocks of either width and a partial
+// last block, at every anchor.
+TYPED_TEST(RowPipeline, MatchesReferenceOnWideRows) {
+  std::mt19937 rng(777 + TypeParam::channels);
+  for (int size = 1; size <= 9; ++size)
+    for (int anchor = 0; anchor < size; ++anchor)
+      for (ZeliBorderType border : {zelBorderConstant, zelBorderReplicate, zelBorderInMemory}) {
+        checkRowCase<TypeParam>(rng, size, anchor, 41 + int(rng() % 220), border);
+        if (::testing::Test::HasFatalFailure()) return;
+      }
+}
+
 // A valid call that the check tests break one argument at a time.
 template <class M>
 struct RowCall {
