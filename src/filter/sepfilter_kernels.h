@@ -16,6 +16,8 @@
 #include <emmintrin.h>
 #include <stdint.h>
 
+#include <type_traits>
+
 #include "core/load.h"
 #include "kernels/simd.h"
 
@@ -93,6 +95,8 @@ template <> struct Wide<simd::Sse2> {
   }
   // Two vectors of doubles rounded to kFloats floats.
   static void storeNarrowed(float* p, D a0, D a1) { _mm_storeu_ps(p, _mm_movelh_ps(_mm_cvtpd_ps(a0), _mm_cvtpd_ps(a1))); }
+  static D loadd(const double* p) { return _mm_loadu_pd(p); }
+  static void stored(double* p, D a) { _mm_storeu_pd(p, a); }
 
   static I zero() { return _mm_setzero_si128(); }
   static I set16(int a) { return _mm_set1_epi16(static_cast<short>(a)); }
@@ -298,6 +302,7 @@ template <class W> struct Lanes<double, W> {
   using Prepared = __m128d;
   static constexpr int kCount = W::kFloats / 2;
   static V load(const float* p) { return W::widen(p); }
+  static V load(const double* p) { return W::loadd(p); }
   static V mul(V a, V b) { return W::muld(a, b); }
   static V add(V a, V b) { return W::addd(a, b); }
   static V set1(double a) { return W::setd(a); }
@@ -328,7 +333,8 @@ template <class W> struct Lanes<float, W> {
 // the temporaries in registers.
 template <typename Acc, typename Isa = simd::Sse2>
 struct FloatDataSum {
-  using L = Lanes<Acc, Wide<Isa>>;
+  using W = Wide<Isa>;
+  using L = Lanes<Acc, W>;
   using Source = float;
   using Out = float;
   using V = typename L::V;
@@ -346,7 +352,7 @@ struct FloatDataSum {
 
   template <class Src, class Taps>
   static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
-    const float* p = src.at(0) + i;
+    const auto* p = src.at(0) + i;
     V a0 = L::mul(taps.vec(0), L::load(p)), a1 = L::mul(taps.vec(0), L::load(p + L::kCount));
     for (int k = 1; k < n; ++k) {
       p = src.at(k) + i;
@@ -614,18 +620,49 @@ void filterSpan(const P& policyRef, const Src& src, typename P::Out* out, int n,
   }
 }
 
-// The dedicated sizes 3 and 5, or the general path, with the policy `p`
-// (given in its SSE2 form) run on instruction set Isa.
-template <class Isa, class P, class Src, class Taps>
-void spanWith(const P& p, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
-  if (n <= 0) return;
-  const auto policy = p.template to<Isa>();
+// The dedicated sizes 3 and 5, or the general path.
+template <class P, class Src, class Taps>
+void spanSized(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
   if (count == 3)
     filterSpan<3>(policy, src, out, n, taps, count);
   else if (count == 5)
     filterSpan<5>(policy, src, out, n, taps, count);
   else
     filterSpan<0>(policy, src, out, n, taps, count);
+}
+
+// Float rows summed in double precision: each element is widened once into
+// a short local run rather than once per tap, and the sums read the run.
+// The products and their order are unchanged. False for kernels too long
+// for the run.
+template <class P, class Taps>
+bool widenedRowSpan(const P& policy, const RowSource<float>& src, float* out, int n, const Taps& taps, int count) {
+  using W = typename P::W;
+  constexpr int kChunk = 256, kReach = 64, kStep = W::kFloats / 2;
+  const int reach = (count - 1) * src.stride;
+  if (reach > kReach) return false;
+  double run[kChunk + kReach];
+  for (int i = 0; i < n; i += kChunk) {
+    const int len = n - i < kChunk ? n - i : kChunk, total = len + reach;
+    const float* from = src.base + i;
+    int j = 0;
+    for (; j + kStep <= total; j += kStep) W::stored(run + j, W::widen(from + j));
+    for (; j < total; ++j) run[j] = from[j];
+    spanSized(policy, RowSource<double>{run, src.stride}, out + i, len, taps, count);
+  }
+  return true;
+}
+
+// The span routine with the policy `p` (given in its SSE2 form) run on
+// instruction set Isa.
+template <class Isa, class P, class Src, class Taps>
+void spanWith(const P& p, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+  if (n <= 0) return;
+  const auto policy = p.template to<Isa>();
+  if constexpr (std::is_same<Src, RowSource<float>>::value && std::is_same<typename P::A, double>::value) {
+    if (widenedRowSpan(policy, src, out, n, taps, count)) return;
+  }
+  spanSized(policy, src, out, n, taps, count);
 }
 
 // The policies the pipeline members run, in their SSE2 form.
