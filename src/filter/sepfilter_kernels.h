@@ -632,18 +632,21 @@ void spanSized(const P& policy, const Src& src, typename P::Out* out, int n, con
 }
 
 // Float rows summed in double precision: each element is widened once into
-// a short local run rather than once per tap, and the sums read the run.
-// The products and their order are unchanged. False for kernels too long
-// for the run.
+// a short run rather than once per tap, and the sums read the run. The
+// products and their order are unchanged. The caller provides the run
+// (kRunLength doubles; a local array here would need unwinding code in the
+// AVX2 objects under the sanitizers). False for kernels too long for it.
+constexpr int kRunChunk = 256, kRunReach = 64, kRunLength = kRunChunk + kRunReach;
+
 template <class P, class Taps>
-bool widenedRowSpan(const P& policy, const RowSource<float>& src, float* out, int n, const Taps& taps, int count) {
+bool widenedRowSpan(const P& policy, const RowSource<float>& src, float* out, int n, const Taps& taps, int count,
+                    double* run) {
   using W = typename P::W;
-  constexpr int kChunk = 256, kReach = 64, kStep = W::kFloats / 2;
+  constexpr int kStep = W::kFloats / 2;
   const int reach = (count - 1) * src.stride;
-  if (reach > kReach) return false;
-  double run[kChunk + kReach];
-  for (int i = 0; i < n; i += kChunk) {
-    const int len = n - i < kChunk ? n - i : kChunk, total = len + reach;
+  if (reach > kRunReach) return false;
+  for (int i = 0; i < n; i += kRunChunk) {
+    const int len = n - i < kRunChunk ? n - i : kRunChunk, total = len + reach;
     const float* from = src.base + i;
     int j = 0;
     for (; j + kStep <= total; j += kStep) W::stored(run + j, W::widen(from + j));
@@ -653,14 +656,17 @@ bool widenedRowSpan(const P& policy, const RowSource<float>& src, float* out, in
   return true;
 }
 
+template <class P, class Src>
+constexpr bool kWidensRows = std::is_same<Src, RowSource<float>>::value && std::is_same<typename P::A, double>::value;
+
 // The span routine with the policy `p` (given in its SSE2 form) run on
-// instruction set Isa.
+// instruction set Isa; `run` serves widenedRowSpan.
 template <class Isa, class P, class Src, class Taps>
-void spanWith(const P& p, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+void spanWith(const P& p, const Src& src, typename P::Out* out, int n, const Taps& taps, int count, double* run) {
   if (n <= 0) return;
   const auto policy = p.template to<Isa>();
-  if constexpr (std::is_same<Src, RowSource<float>>::value && std::is_same<typename P::A, double>::value) {
-    if (widenedRowSpan(policy, src, out, n, taps, count)) return;
+  if constexpr (kWidensRows<P, Src>) {
+    if (widenedRowSpan(policy, src, out, n, taps, count, run)) return;
   }
   spanSized(policy, src, out, n, taps, count);
 }
@@ -700,7 +706,7 @@ using ColPairs16s8u = PairSum<int16_t, uint8_t, true>;
   X(Isa, SingleSum, ColumnSource<float>, ComputedTaps<float>)
 
 #define ZELCV_SEP_SPAN(Isa, P, Src, Taps) \
-  void spanWith<Isa, P, Src, Taps>(const P&, const Src&, P::Out*, int, const Taps&, int);
+  void spanWith<Isa, P, Src, Taps>(const P&, const Src&, P::Out*, int, const Taps&, int, double*);
 #define ZELCV_SEP_EXTERN_SPAN(Isa, P, Src, Taps) extern template ZELCV_SEP_SPAN(Isa, P, Src, Taps)
 // Built in sepfilter_avx2.cpp.
 ZELCV_SEP_SPANS(ZELCV_SEP_EXTERN_SPAN, avx2::Isa)
@@ -708,10 +714,12 @@ ZELCV_SEP_SPANS(ZELCV_SEP_EXTERN_SPAN, avx2::Isa)
 // The span routine on the instruction set chosen at load.
 template <class P, class Src, class Taps>
 void filterSpanAnySize(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+  double runSpace[kWidensRows<P, Src> ? kRunLength : 1];
+  double* run = runSpace;
   if (useAvx2Kernels())
-    spanWith<avx2::Isa>(policy, src, out, n, taps, count);
+    spanWith<avx2::Isa>(policy, src, out, n, taps, count, run);
   else
-    spanWith<simd::Sse2>(policy, src, out, n, taps, count);
+    spanWith<simd::Sse2>(policy, src, out, n, taps, count, run);
 }
 
 }  // namespace sep
