@@ -28,6 +28,9 @@ template <> struct Wide<avx2::Isa> {
   static D setd(double a) { return _mm256_set1_pd(a); }
   static D addd(D a, D b) { return _mm256_add_pd(a, b); }
   static D muld(D a, D b) { return _mm256_mul_pd(a, b); }
+  // The product of two floats is exact in double, so the fused form rounds
+  // once where the separate product and sum round once too: the same bits.
+  static D addExactProductd(D acc, D a, D b) { return _mm256_fmadd_pd(a, b, acc); }
   static double firstd(D a) { return _mm256_cvtsd_f64(a); }
   static D widen(const float* p) { return _mm256_cvtps_pd(_mm_loadu_ps(p)); }
   static D loadd(const double* p) { return _mm256_loadu_pd(p); }

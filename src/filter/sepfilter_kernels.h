@@ -88,6 +88,8 @@ template <> struct Wide<simd::Sse2> {
   static D setd(double a) { return _mm_set1_pd(a); }
   static D addd(D a, D b) { return _mm_add_pd(a, b); }
   static D muld(D a, D b) { return _mm_mul_pd(a, b); }
+  // acc + a x b where the product is exact in double (two floats widened).
+  static D addExactProductd(D acc, D a, D b) { return _mm_add_pd(acc, _mm_mul_pd(a, b)); }
   static double firstd(D a) { return _mm_cvtsd_f64(a); }
   // kFloats / 2 floats widened to doubles (an 8-byte load, one cvtps2pd).
   static D widen(const float* p) {
@@ -304,7 +306,8 @@ template <class W> struct Lanes<double, W> {
   static V load(const float* p) { return W::widen(p); }
   static V load(const double* p) { return W::loadd(p); }
   static V mul(V a, V b) { return W::muld(a, b); }
-  static V add(V a, V b) { return W::addd(a, b); }
+  // acc + a x b for a float tap and a float pixel widened to double.
+  static V addProduct(V acc, V a, V b) { return W::addExactProductd(acc, a, b); }
   static V set1(double a) { return W::setd(a); }
   static V prepared(const Prepared* p) { return W::tapd(p); }
   static double lane0(V v) { return W::firstd(v); }
@@ -317,7 +320,7 @@ template <class W> struct Lanes<float, W> {
   static constexpr int kCount = W::kFloats;
   static V load(const float* p) { return W::loadf(p); }
   static V mul(V a, V b) { return W::mulf(a, b); }
-  static V add(V a, V b) { return W::addf(a, b); }
+  static V addProduct(V acc, V a, V b) { return W::addf(acc, W::mulf(a, b)); }
   static V set1(float a) { return W::setf(a); }
   static V prepared(const Prepared* p) { return W::tapf(p); }
   static float lane0(V v) { return W::firstf(v); }
@@ -356,8 +359,8 @@ struct FloatDataSum {
     V a0 = L::mul(taps.vec(0), L::load(p)), a1 = L::mul(taps.vec(0), L::load(p + L::kCount));
     for (int k = 1; k < n; ++k) {
       p = src.at(k) + i;
-      a0 = L::add(a0, L::mul(taps.vec(k), L::load(p)));
-      a1 = L::add(a1, L::mul(taps.vec(k), L::load(p + L::kCount)));
+      a0 = L::addProduct(a0, taps.vec(k), L::load(p));
+      a1 = L::addProduct(a1, taps.vec(k), L::load(p + L::kCount));
     }
     L::store(out, a0, a1);
   }
