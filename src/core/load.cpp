@@ -8,8 +8,9 @@ namespace {
 int gCpuFeatureFlag = 0;
 bool gAvx2Kernels = false;
 constexpr uint32_t kFlagFeatures = zelCpuSSSE3 | zelCpuSSE41;
-// zelcore reports AVX and AVX2 only where the OS saves the wide registers.
-constexpr uint32_t kAvx2Features = zelCpuAVX | zelCpuAVX2;
+// zelcore reports AVX, FMA and AVX2 only where the OS saves the wide
+// registers. Every processor with AVX2 so far also has FMA.
+constexpr uint32_t kAvx2Features = zelCpuAVX | zelCpuAVX2 | zelCpuFMA;
 }  // namespace
 
 int onLibraryLoad(void* /*module*/, uint32_t reason, void* /*reserved*/) {

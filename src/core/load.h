@@ -21,7 +21,7 @@ int onLibraryLoad(void* module, uint32_t reason, void* reserved);
 int cpuFeatureFlag();
 
 // Whether the AVX2 kernels run instead of the SSE2 ones: chosen at load, when
-// the processor and the operating system support AVX2. Both give the same
+// the processor and the operating system support AVX2 and FMA. Both give the same
 // results bit for bit; before the load routine runs, the SSE2 kernels do.
 bool useAvx2Kernels();
 

@@ -15,7 +15,6 @@ namespace zelcv {
 namespace {
 
 using sep::FloatSum;
-using sep::LowSum;
 using sep::SingleSum;
 
 enum class Divisor { checked, none };
@@ -55,22 +54,16 @@ ZelStatus columnMember(const P& policy, Divisor rule, const typename P::Source* 
       using Pairs = sep::PairSum<Zel16s, D, true>;
       __m128i pairs[kMaxPairs];
       Pairs::preparePairs(kernel, kernelSize, pairs);
-      runColumns<kChannels>(Pairs{pairs, scale}, sep::ComputedTaps<Pairs, Zel16s>{kernel, scale}, src, dst, dstStep,
+      runColumns<kChannels>(Pairs{pairs, scale}, sep::ComputedTaps<Zel16s>{kernel, scale}, src, dst, dstStep,
                             roi, kernelSize);
       return zelStatusOk;
     }
   }
   // The taps are formed where they are used (the work buffer is sized by
   // the width, not the kernel); the sizes 3 and 5 keep them in registers.
-  runColumns<kChannels>(policy, sep::ComputedTaps<P, Tap>{kernel, scale}, src, dst, dstStep, roi, kernelSize);
+  runColumns<kChannels>(policy, sep::ComputedTaps<Tap>{kernel, scale}, src, dst, dstStep, roi, kernelSize);
   return zelStatusOk;
 }
-
-// Integer members round to nearest (ties to even) at every pixel.
-using Col16s = FloatSum<Zel16s, Zel16s, true>;
-using Col16s8s = FloatSum<Zel16s, Zel8s, true>;
-using Col16s8u = FloatSum<Zel16s, Zel8u, true>;
-using Col16u = FloatSum<Zel16u, Zel16u, true>;
 
 }  // namespace
 }  // namespace zelcv
@@ -86,16 +79,17 @@ using zelcv::Divisor;
                                           kernelSize, divisor, buffer);                                       \
   }
 
-ZELCV_COLUMN_MEMBER(16s_C1R, Zel16s, Zel16s, zelcv::Col16s, 1, {})
-ZELCV_COLUMN_MEMBER(16s_C3R, Zel16s, Zel16s, zelcv::Col16s, 3, {})
-ZELCV_COLUMN_MEMBER(16s8s_C1R, Zel16s, Zel8s, zelcv::Col16s8s, 1, {})
-ZELCV_COLUMN_MEMBER(16s8s_C3R, Zel16s, Zel8s, zelcv::Col16s8s, 3, {})
-ZELCV_COLUMN_MEMBER(16s8u_C1R, Zel16s, Zel8u, zelcv::Col16s8u, 1, {})
-ZELCV_COLUMN_MEMBER(16s8u_C3R, Zel16s, Zel8u, zelcv::Col16s8u, 3, {})
-ZELCV_COLUMN_MEMBER(16u_C1R, Zel16u, Zel16u, zelcv::Col16u, 1, {})
-ZELCV_COLUMN_MEMBER(16u_C3R, Zel16u, Zel16u, zelcv::Col16u, 3, {})
-ZELCV_COLUMN_MEMBER(Low_16s_C1R, Zel16s, Zel16s, zelcv::sep::LowSum, 1, {zelcv::sep::LowScale::of(divisor)})
-ZELCV_COLUMN_MEMBER(Low_16s_C3R, Zel16s, Zel16s, zelcv::sep::LowSum, 3, {zelcv::sep::LowScale::of(divisor)})
+// Integer members round to nearest (ties to even) at every pixel.
+ZELCV_COLUMN_MEMBER(16s_C1R, Zel16s, Zel16s, zelcv::sep::Col16s, 1, {})
+ZELCV_COLUMN_MEMBER(16s_C3R, Zel16s, Zel16s, zelcv::sep::Col16s, 3, {})
+ZELCV_COLUMN_MEMBER(16s8s_C1R, Zel16s, Zel8s, zelcv::sep::Col16s8s, 1, {})
+ZELCV_COLUMN_MEMBER(16s8s_C3R, Zel16s, Zel8s, zelcv::sep::Col16s8s, 3, {})
+ZELCV_COLUMN_MEMBER(16s8u_C1R, Zel16s, Zel8u, zelcv::sep::Col16s8u, 1, {})
+ZELCV_COLUMN_MEMBER(16s8u_C3R, Zel16s, Zel8u, zelcv::sep::Col16s8u, 3, {})
+ZELCV_COLUMN_MEMBER(16u_C1R, Zel16u, Zel16u, zelcv::sep::Col16u, 1, {})
+ZELCV_COLUMN_MEMBER(16u_C3R, Zel16u, Zel16u, zelcv::sep::Col16u, 3, {})
+ZELCV_COLUMN_MEMBER(Low_16s_C1R, Zel16s, Zel16s, zelcv::sep::LowSum<>, 1, {zelcv::sep::LowScale::of(divisor)})
+ZELCV_COLUMN_MEMBER(Low_16s_C3R, Zel16s, Zel16s, zelcv::sep::LowSum<>, 3, {zelcv::sep::LowScale::of(divisor)})
 
 ZELCV_ENTRY(zeliFilterColumnPipeline_32f_C1R)(const Zel32f** src, Zel32f* dst, int dstStep, ZeliSize roiSize,
                                               const Zel32f* kernel, int kernelSize, Zel8u* buffer) {

@@ -17,7 +17,6 @@ namespace {
 using sep::DoubleSum;
 using sep::FloatSum;
 using sep::LowScale;
-using sep::LowSum;
 
 // Checks shared by every row member, in their fixed order; the divisor test
 // that follows differs per member.
@@ -95,9 +94,9 @@ template <class P, int kChannels, typename Tap>
 void runPrepared(const P& policy, const RowBuffer& buf, const Tap* kernel, float scale,
                  const typename P::Source* src, int srcStep, typename P::Out* const* dst, ZeliSize roi,
                  int kernelSize, int xAnchor, ZeliBorderType border, const typename P::Source* borderValue) {
-  auto* vecTaps = reinterpret_cast<typename P::V*>(buf.taps);
+  auto* vecTaps = reinterpret_cast<typename P::Prepared*>(buf.taps);
   for (int k = 0; k < kernelSize; ++k) vecTaps[k] = P::Tap::broadcast(P::Tap::make(kernel[k], scale));
-  runRows<P, kChannels>(policy, sep::PreparedTaps<P>{vecTaps}, reinterpret_cast<typename P::Source*>(buf.ext), src,
+  runRows<P, kChannels>(policy, sep::PreparedTaps<typename P::TapType>{vecTaps}, reinterpret_cast<typename P::Source*>(buf.ext), src,
                         srcStep, dst, roi, kernelSize, xAnchor, border, borderValue);
 }
 
@@ -117,14 +116,14 @@ void runIntegerRows(const P& policy, const Zel16s* kernel, int divisor, const ty
     if (sep::exactInFloat(kernel, kernelSize, divisor, maxAbs, &tapSum)) {
       if constexpr (std::is_same<S, Zel8u>::value) {
         if (tapSum * 255 <= 32767) {
-          runPrepared<sep::ShortSum, kChannels>(sep::ShortSum{scale, divisor == 1}, buf, kernel, scale, src, srcStep,
+          runPrepared<sep::ShortSum<>, kChannels>(sep::ShortSum<>{scale, divisor == 1}, buf, kernel, scale, src, srcStep,
                                                 dst, roi, kernelSize, xAnchor, border, borderValue);
           return;
         }
       }
       using Pairs = sep::PairSum<S, D, false>;
       Pairs::preparePairs(kernel, kernelSize, buf.taps);
-      runRows<Pairs, kChannels>(Pairs{buf.taps, scale}, sep::ComputedTaps<Pairs, Zel16s>{kernel, scale},
+      runRows<Pairs, kChannels>(Pairs{buf.taps, scale}, sep::ComputedTaps<Zel16s>{kernel, scale},
                                 reinterpret_cast<S*>(buf.ext), src, srcStep, dst, roi, kernelSize, xAnchor, border,
                                 borderValue);
       return;
@@ -167,10 +166,6 @@ ZelStatus rowMember32f(const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize ro
   return zelStatusOk;
 }
 
-using Row16s = FloatSum<Zel16s, Zel16s, false>;
-using Row16u = FloatSum<Zel16u, Zel16u, false>;
-using Row8u16s = FloatSum<Zel8u, Zel16s, false>;
-
 }  // namespace
 }  // namespace zelcv
 
@@ -188,18 +183,18 @@ using zelcv::rowMember;
                                        kernelSize, xAnchor, borderType, valueArg, divisor, buffer);            \
   }
 
-ZELCV_ROW_MEMBER(16s_C1R, Zel16s, Zel16s, Zel16s, &borderValue, zelcv::Row16s, 1, {}, nonZero)
-ZELCV_ROW_MEMBER(16s_C3R, Zel16s, Zel16s, const Zel16s*, borderValue, zelcv::Row16s, 3, {}, nonZero)
+ZELCV_ROW_MEMBER(16s_C1R, Zel16s, Zel16s, Zel16s, &borderValue, zelcv::sep::Row16s, 1, {}, nonZero)
+ZELCV_ROW_MEMBER(16s_C3R, Zel16s, Zel16s, const Zel16s*, borderValue, zelcv::sep::Row16s, 3, {}, nonZero)
 // A negative divisor is refused for unsigned data only.
-ZELCV_ROW_MEMBER(16u_C1R, Zel16u, Zel16u, Zel16u, &borderValue, zelcv::Row16u, 1, {}, positive)
-ZELCV_ROW_MEMBER(16u_C3R, Zel16u, Zel16u, const Zel16u*, borderValue, zelcv::Row16u, 3, {}, positive)
+ZELCV_ROW_MEMBER(16u_C1R, Zel16u, Zel16u, Zel16u, &borderValue, zelcv::sep::Row16u, 1, {}, positive)
+ZELCV_ROW_MEMBER(16u_C3R, Zel16u, Zel16u, const Zel16u*, borderValue, zelcv::sep::Row16u, 3, {}, positive)
 // The one-channel 8u member never checked its divisor; a zero divisor makes
 // the scaled taps infinite or NaN and the results follow the clamp's rules.
-ZELCV_ROW_MEMBER(8u16s_C1R, Zel8u, Zel16s, Zel8u, &borderValue, zelcv::Row8u16s, 1, {}, unchecked)
-ZELCV_ROW_MEMBER(8u16s_C3R, Zel8u, Zel16s, const Zel8u*, borderValue, zelcv::Row8u16s, 3, {}, nonZero)
-ZELCV_ROW_MEMBER(Low_16s_C1R, Zel16s, Zel16s, Zel16s, &borderValue, zelcv::LowSum, 1,
+ZELCV_ROW_MEMBER(8u16s_C1R, Zel8u, Zel16s, Zel8u, &borderValue, zelcv::sep::Row8u16s, 1, {}, unchecked)
+ZELCV_ROW_MEMBER(8u16s_C3R, Zel8u, Zel16s, const Zel8u*, borderValue, zelcv::sep::Row8u16s, 3, {}, nonZero)
+ZELCV_ROW_MEMBER(Low_16s_C1R, Zel16s, Zel16s, Zel16s, &borderValue, zelcv::sep::LowSum<>, 1,
                  {zelcv::LowScale::of(divisor)}, nonZero)
-ZELCV_ROW_MEMBER(Low_16s_C3R, Zel16s, Zel16s, const Zel16s*, borderValue, zelcv::LowSum, 3,
+ZELCV_ROW_MEMBER(Low_16s_C3R, Zel16s, Zel16s, const Zel16s*, borderValue, zelcv::sep::LowSum<>, 3,
                  {zelcv::LowScale::of(divisor)}, nonZero)
 
 ZELCV_ENTRY(zeliFilterRowBorderPipeline_32f_C1R)(const Zel32f* src, int srcStep, Zel32f** dst, ZeliSize roiSize,

@@ -4,16 +4,27 @@
 // pointer (column pass). An arithmetic policy says how a sum is formed and
 // converted; the vector block and the scalar tail of each policy add the
 // same products in the same order (tap 0 first, no leading zero), so every
-// path, every alignment and both x86 targets give the same bits.
+// path, every alignment, both vector widths and both x86 targets give the
+// same bits.
+//
+// The policies are written once over the instruction set: Wide<Isa> holds
+// the few vector operations they use, as 128-bit SSE2 here and as 256-bit
+// AVX2 in sepfilter_avx2.cpp, which alone builds the AVX2 instances.
 #ifndef ZELCV_FILTER_SEPFILTER_KERNELS_H
 #define ZELCV_FILTER_SEPFILTER_KERNELS_H
 
 #include <emmintrin.h>
 #include <stdint.h>
 
+#include <type_traits>
+
+#include "core/load.h"
 #include "kernels/simd.h"
 
 namespace zelcv {
+namespace avx2 {
+struct Isa;
+}
 namespace sep {
 
 // ---- sources -------------------------------------------------------------
@@ -48,43 +59,130 @@ struct ColumnSource {
   }
 };
 
+// ---- vector operations per instruction set ---------------------------------
+
+// F: floats, D: doubles, I: integers; kFloats 32-bit lanes per vector.
+// Integer sums come in "pair layout": two vectors a0, a1 of 32-bit lanes
+// that packs32(a0, a1) turns into 16-bit lanes in element order, as the
+// unpacklo/unpackhi of 16-bit lanes leave them (within each 128-bit half).
+template <typename Isa> struct Wide;
+
+template <> struct Wide<simd::Sse2> {
+  using F = __m128;
+  using D = __m128d;
+  using I = __m128i;
+  static constexpr int kFloats = 4;
+
+  static F setf(float a) { return _mm_set1_ps(a); }
+  static F addf(F a, F b) { return _mm_add_ps(a, b); }
+  static F mulf(F a, F b) { return _mm_mul_ps(a, b); }
+  static F minf(F a, F b) { return _mm_min_ps(a, b); }
+  static F maxf(F a, F b) { return _mm_max_ps(a, b); }
+  static I roundToInt(F a) { return _mm_cvtps_epi32(a); }
+  static I truncToInt(F a) { return _mm_cvttps_epi32(a); }
+  static F toFloat(I a) { return _mm_cvtepi32_ps(a); }
+  static float firstf(F a) { return _mm_cvtss_f32(a); }
+  static F loadf(const float* p) { return _mm_loadu_ps(p); }
+  static void storef(float* p, F a) { _mm_storeu_ps(p, a); }
+
+  static D setd(double a) { return _mm_set1_pd(a); }
+  static D addd(D a, D b) { return _mm_add_pd(a, b); }
+  static D muld(D a, D b) { return _mm_mul_pd(a, b); }
+  // acc + a x b where the product is exact in double (two floats widened).
+  static D addExactProductd(D acc, D a, D b) { return _mm_add_pd(acc, _mm_mul_pd(a, b)); }
+  static double firstd(D a) { return _mm_cvtsd_f64(a); }
+  // kFloats / 2 floats widened to doubles (an 8-byte load, one cvtps2pd).
+  static D widen(const float* p) {
+    return _mm_cvtps_pd(_mm_castsi128_ps(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p))));
+  }
+  // Two vectors of doubles rounded to kFloats floats.
+  static void storeNarrowed(float* p, D a0, D a1) { _mm_storeu_ps(p, _mm_movelh_ps(_mm_cvtpd_ps(a0), _mm_cvtpd_ps(a1))); }
+  static D loadd(const double* p) { return _mm_loadu_pd(p); }
+  static void stored(double* p, D a) { _mm_storeu_pd(p, a); }
+
+  static I zero() { return _mm_setzero_si128(); }
+  static I set16(int a) { return _mm_set1_epi16(static_cast<short>(a)); }
+  static I set32(int a) { return _mm_set1_epi32(a); }
+  static I loadi(const void* p) { return _mm_loadu_si128(static_cast<const __m128i*>(p)); }
+  static void storei(void* p, I a) { _mm_storeu_si128(static_cast<__m128i*>(p), a); }
+  static I add16(I a, I b) { return _mm_add_epi16(a, b); }
+  static I add32(I a, I b) { return _mm_add_epi32(a, b); }
+  static I mullo16(I a, I b) { return _mm_mullo_epi16(a, b); }
+  static I mulhi16(I a, I b) { return _mm_mulhi_epi16(a, b); }
+  static I madd16(I a, I b) { return _mm_madd_epi16(a, b); }
+  static I lo16(I a, I b) { return _mm_unpacklo_epi16(a, b); }
+  static I hi16(I a, I b) { return _mm_unpackhi_epi16(a, b); }
+  static I bitAnd(I a, I b) { return _mm_and_si128(a, b); }
+  static I bitOr(I a, I b) { return _mm_or_si128(a, b); }
+  static I min32(I a, I b) { return simd::Vec<int32_t>::min(a, b); }
+  static I max32(I a, I b) { return simd::Vec<int32_t>::max(a, b); }
+  template <int n> static I srai32(I a) { return _mm_srai_epi32(a, n); }
+  template <int n> static I slli32(I a) { return _mm_slli_epi32(a, n); }
+  template <int n> static I srli32(I a) { return _mm_srli_epi32(a, n); }
+  static I packs32(I a, I b) { return _mm_packs_epi32(a, b); }
+  static int first16(I a) { return static_cast<int16_t>(_mm_cvtsi128_si32(a)); }
+
+  // 2 kFloats bytes widened to 16-bit lanes in order.
+  static I widenBytes(const uint8_t* p) {
+    return _mm_unpacklo_epi8(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)), _mm_setzero_si128());
+  }
+  // 4 kFloats bytes widened to two vectors of 16-bit lanes in order.
+  static void widenBytes2(const uint8_t* p, I& a, I& b) {
+    const I v = loadi(p);
+    a = _mm_unpacklo_epi8(v, _mm_setzero_si128());
+    b = _mm_unpackhi_epi8(v, _mm_setzero_si128());
+  }
+
+  // 16-bit lanes in element order, already inside the range, narrowed.
+  static void storeBytes(uint8_t* p, I v) { _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packus_epi16(v, v)); }
+  static void storeBytes(int8_t* p, I v) { _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packs_epi16(v, v)); }
+  // Pair layout inside 0 .. 65535 to unsigned 16 bits. No unsigned 32->16
+  // pack in SSE2: shift into the signed range and back.
+  static void storeUnsigned(uint16_t* p, I a0, I a1) {
+    const I bias = _mm_set1_epi32(32768);
+    I v = _mm_packs_epi32(_mm_sub_epi32(a0, bias), _mm_sub_epi32(a1, bias));
+    storei(p, _mm_xor_si128(v, _mm_set1_epi16(static_cast<short>(0x8000))));
+  }
+
+  // A tap prepared as a 16-byte vector (every lane the same), as a vector.
+  static F tapf(const __m128* p) { return *p; }
+  static D tapd(const __m128d* p) { return *p; }
+  static I tap16(const __m128i* p) { return *p; }
+  static I tap32(const __m128i* p) { return *p; }
+};
+
 // ---- loads and stores ------------------------------------------------------
 
-inline void load8(const uint8_t* p, __m128& a, __m128& b) {
-  const __m128i zero = _mm_setzero_si128();
-  __m128i w = _mm_unpacklo_epi8(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)), zero);
-  a = _mm_cvtepi32_ps(_mm_unpacklo_epi16(w, zero));
-  b = _mm_cvtepi32_ps(_mm_unpackhi_epi16(w, zero));
+// kFloats * 2 elements converted to floats in pair layout.
+template <class W> void toFloats(const uint8_t* p, typename W::F& a, typename W::F& b) {
+  const typename W::I w = W::widenBytes(p);
+  a = W::toFloat(W::lo16(w, W::zero()));
+  b = W::toFloat(W::hi16(w, W::zero()));
 }
-inline void load8(const int16_t* p, __m128& a, __m128& b) {
-  __m128i v = simd::Vec<int16_t>::loadu(p);
-  a = _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(v, v), 16));
-  b = _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpackhi_epi16(v, v), 16));
+template <class W> void toFloats(const int16_t* p, typename W::F& a, typename W::F& b) {
+  const typename W::I v = W::loadi(p);
+  a = W::toFloat(W::template srai32<16>(W::lo16(v, v)));
+  b = W::toFloat(W::template srai32<16>(W::hi16(v, v)));
 }
-inline void load8(const uint16_t* p, __m128& a, __m128& b) {
-  const __m128i zero = _mm_setzero_si128();
-  __m128i v = simd::Vec<uint16_t>::loadu(p);
-  a = _mm_cvtepi32_ps(_mm_unpacklo_epi16(v, zero));
-  b = _mm_cvtepi32_ps(_mm_unpackhi_epi16(v, zero));
+template <class W> void toFloats(const uint16_t* p, typename W::F& a, typename W::F& b) {
+  const typename W::I v = W::loadi(p);
+  a = W::toFloat(W::lo16(v, W::zero()));
+  b = W::toFloat(W::hi16(v, W::zero()));
 }
 
-// Stores 8 values that are already inside the range of the element type.
-inline void store8(int16_t* p, __m128i a, __m128i b) {
-  simd::Vec<int16_t>::storeu(p, _mm_packs_epi32(a, b));
+// kFloats * 2 elements as 16-bit lanes in order (8-bit data is unsigned).
+template <class W> typename W::I to16(const uint8_t* p) { return W::widenBytes(p); }
+template <class W> typename W::I to16(const int16_t* p) { return W::loadi(p); }
+
+// Stores kFloats * 2 values in pair layout that are already inside the
+// range of the element type.
+template <class W> void storePair(int16_t* p, typename W::I a0, typename W::I a1) { W::storei(p, W::packs32(a0, a1)); }
+template <class W> void storePair(uint16_t* p, typename W::I a0, typename W::I a1) { W::storeUnsigned(p, a0, a1); }
+template <class W> void storePair(uint8_t* p, typename W::I a0, typename W::I a1) {
+  W::storeBytes(p, W::packs32(a0, a1));
 }
-inline void store8(uint16_t* p, __m128i a, __m128i b) {
-  // No unsigned 32->16 pack in SSE2: shift into the signed range and back.
-  const __m128i bias = _mm_set1_epi32(32768);
-  __m128i v = _mm_packs_epi32(_mm_sub_epi32(a, bias), _mm_sub_epi32(b, bias));
-  simd::Vec<uint16_t>::storeu(p, _mm_xor_si128(v, _mm_set1_epi16(static_cast<short>(0x8000))));
-}
-inline void store8(uint8_t* p, __m128i a, __m128i b) {
-  __m128i v = _mm_packs_epi32(a, b);
-  _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packus_epi16(v, v));
-}
-inline void store8(int8_t* p, __m128i a, __m128i b) {
-  __m128i v = _mm_packs_epi32(a, b);
-  _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packs_epi16(v, v));
+template <class W> void storePair(int8_t* p, typename W::I a0, typename W::I a1) {
+  W::storeBytes(p, W::packs32(a0, a1));
 }
 
 template <typename D> struct Range;
@@ -96,7 +194,7 @@ template <> struct Range<int16_t> { static constexpr float lo = -32768.0f, hi = 
 // The clamp of the vector path written for one value: max then min, each
 // keeping its second operand when the first is NaN (a zero divisor of a
 // member that does not refuse one), exactly as maxps and minps do.
-inline float clampLikeVector(float v, float lo, float hi) {
+static inline float clampLikeVector(float v, float lo, float hi) {
   v = v > lo ? v : lo;
   return v < hi ? v : hi;
 }
@@ -104,20 +202,35 @@ inline float clampLikeVector(float v, float lo, float hi) {
 // ---- taps ------------------------------------------------------------------
 
 // Taps reach the policies through an accessor: vec(k) is tap k broadcast to
-// a vector, scalar(k) the same value for the scalar tail.
-template <class P>
-struct PreparedTaps {  // broadcast vectors built once per call (row pass buffer)
-  const typename P::V* v;
-  typename P::V vec(int k) const { return v[k]; }
-  typename P::A scalar(int k) const { return P::Tap::lane0(v[k]); }
+// a vector of the policy, scalar(k) the same value for the scalar tail.
+// The accessors below serve every policy and instruction set; Bound ties
+// one to a policy.
+// The 16-byte vector that holds a prepared tap of type T.
+template <typename T> struct PreparedVec;
+template <> struct PreparedVec<float> { using type = __m128; };
+template <> struct PreparedVec<double> { using type = __m128d; };
+template <> struct PreparedVec<int16_t> { using type = __m128i; };
+
+template <typename T>
+struct PreparedTaps {  // 16-byte vectors built once per call (row pass buffer)
+  const typename PreparedVec<T>::type* v;
+  template <class P> typename P::V vec(int k) const { return P::Tap::prepared(v + k); }
+  template <class P> typename P::A scalar(int k) const { return P::Tap::lane0(vec<P>(k)); }
 };
 
-template <class P, typename T>
+template <typename T>
 struct ComputedTaps {  // formed from the caller's kernel where they are used
   const T* kernel;
   float scale;
-  typename P::A scalar(int k) const { return P::Tap::make(kernel[k], scale); }
-  typename P::V vec(int k) const { return P::Tap::broadcast(scalar(k)); }
+  template <class P> typename P::A scalar(int k) const { return P::Tap::make(kernel[k], scale); }
+  template <class P> typename P::V vec(int k) const { return P::Tap::broadcast(scalar<P>(k)); }
+};
+
+template <class P, class Taps>
+struct Bound {
+  const Taps& taps;
+  typename P::V vec(int k) const { return taps.template vec<P>(k); }
+  typename P::A scalar(int k) const { return taps.template scalar<P>(k); }
 };
 
 template <class P, int N>
@@ -129,41 +242,49 @@ struct CachedTaps {  // a size fixed at compile time, held in registers
 };
 
 // ---- arithmetic policies ---------------------------------------------------
+//
+// Each policy is a template over the instruction set; `to<I>()` gives the
+// same policy (same parameters) for instruction set I.
 
 // Integer data, single-precision taps (already scaled by 1/divisor), single
 // precision sum, clamp, then truncation (row pass) or rounding to nearest
 // even (column pass).
-template <typename S, typename D, bool kRound>
+template <typename S, typename D, bool kRound, typename Isa = simd::Sse2>
 struct FloatSum {
+  using W = Wide<Isa>;
   using Source = S;
   using Out = D;
-  using V = __m128;
+  using V = typename W::F;
   using A = float;
-  static constexpr int kBlock = 8;
+  using TapType = float;
+  using Prepared = __m128;
+  static constexpr int kBlock = 2 * W::kFloats;
+  template <class I> FloatSum<S, D, kRound, I> to() const { return {}; }
   struct Tap {  // one tap of the call, from the integer kernel
     template <typename T> static A make(T tap, float scale) { return static_cast<float>(tap) * scale; }
-    static V broadcast(A a) { return _mm_set1_ps(a); }
-    static A lane0(V v) { return _mm_cvtss_f32(v); }
+    static V broadcast(A a) { return W::setf(a); }
+    static V prepared(const Prepared* p) { return W::tapf(p); }
+    static A lane0(V v) { return W::firstf(v); }
   };
 
   template <class Src, class Taps>
   static void block(const Src& src, int i, D* out, const Taps& taps, int n) {
-    __m128 a0, a1, p0, p1;
-    load8(src.at(0) + i, p0, p1);
-    a0 = _mm_mul_ps(taps.vec(0), p0);
-    a1 = _mm_mul_ps(taps.vec(0), p1);
+    V a0, a1, p0, p1;
+    toFloats<W>(src.at(0) + i, p0, p1);
+    a0 = W::mulf(taps.vec(0), p0);
+    a1 = W::mulf(taps.vec(0), p1);
     for (int k = 1; k < n; ++k) {
-      load8(src.at(k) + i, p0, p1);
-      a0 = _mm_add_ps(a0, _mm_mul_ps(taps.vec(k), p0));
-      a1 = _mm_add_ps(a1, _mm_mul_ps(taps.vec(k), p1));
+      toFloats<W>(src.at(k) + i, p0, p1);
+      a0 = W::addf(a0, W::mulf(taps.vec(k), p0));
+      a1 = W::addf(a1, W::mulf(taps.vec(k), p1));
     }
-    const __m128 lo = _mm_set1_ps(Range<D>::lo), hi = _mm_set1_ps(Range<D>::hi);
-    a0 = _mm_min_ps(_mm_max_ps(a0, lo), hi);
-    a1 = _mm_min_ps(_mm_max_ps(a1, lo), hi);
+    const V lo = W::setf(Range<D>::lo), hi = W::setf(Range<D>::hi);
+    a0 = W::minf(W::maxf(a0, lo), hi);
+    a1 = W::minf(W::maxf(a1, lo), hi);
     if (kRound)
-      store8(out, _mm_cvtps_epi32(a0), _mm_cvtps_epi32(a1));
+      storePair<W>(out, W::roundToInt(a0), W::roundToInt(a1));
     else
-      store8(out, _mm_cvttps_epi32(a0), _mm_cvttps_epi32(a1));
+      storePair<W>(out, W::truncToInt(a0), W::truncToInt(a1));
   }
 
   template <class Src, class Taps>
@@ -175,34 +296,37 @@ struct FloatSum {
   }
 };
 
-// Two floats widened to doubles (an unaligned 8-byte load, one cvtps2pd).
-inline __m128d widen2(const float* p) {
-  return _mm_cvtps_pd(_mm_castsi128_ps(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p))));
-}
-
 // Vector lanes of the accumulator type of the 32f members.
-template <typename Acc> struct Lanes;
-template <> struct Lanes<double> {
-  using V = __m128d;
-  static constexpr int kCount = 2;
-  static V load(const float* p) { return widen2(p); }
-  static V mul(V a, V b) { return _mm_mul_pd(a, b); }
-  static V add(V a, V b) { return _mm_add_pd(a, b); }
-  static V set1(double a) { return _mm_set1_pd(a); }
-  static double lane0(V v) { return _mm_cvtsd_f64(v); }
-  static void store(float* out, V a0, V a1) { _mm_storeu_ps(out, _mm_movelh_ps(_mm_cvtpd_ps(a0), _mm_cvtpd_ps(a1))); }
+template <typename Acc, class W> struct Lanes;
+template <class W> struct Lanes<double, W> {
+  using V = typename W::D;
+  using TapType = double;
+  using Prepared = __m128d;
+  static constexpr int kCount = W::kFloats / 2;
+  static V load(const float* p) { return W::widen(p); }
+  static V load(const double* p) { return W::loadd(p); }
+  static V mul(V a, V b) { return W::muld(a, b); }
+  // acc + a x b for a float tap and a float pixel widened to double.
+  static V addProduct(V acc, V a, V b) { return W::addExactProductd(acc, a, b); }
+  static V set1(double a) { return W::setd(a); }
+  static V prepared(const Prepared* p) { return W::tapd(p); }
+  static double lane0(V v) { return W::firstd(v); }
+  static void store(float* out, V a0, V a1) { W::storeNarrowed(out, a0, a1); }
 };
-template <> struct Lanes<float> {
-  using V = __m128;
-  static constexpr int kCount = 4;
-  static V load(const float* p) { return _mm_loadu_ps(p); }
-  static V mul(V a, V b) { return _mm_mul_ps(a, b); }
-  static V add(V a, V b) { return _mm_add_ps(a, b); }
-  static V set1(float a) { return _mm_set1_ps(a); }
-  static float lane0(V v) { return _mm_cvtss_f32(v); }
+template <class W> struct Lanes<float, W> {
+  using V = typename W::F;
+  using TapType = float;
+  using Prepared = __m128;
+  static constexpr int kCount = W::kFloats;
+  static V load(const float* p) { return W::loadf(p); }
+  static V mul(V a, V b) { return W::mulf(a, b); }
+  static V addProduct(V acc, V a, V b) { return W::addf(acc, W::mulf(a, b)); }
+  static V set1(float a) { return W::setf(a); }
+  static V prepared(const Prepared* p) { return W::tapf(p); }
+  static float lane0(V v) { return W::firstf(v); }
   static void store(float* out, V a0, V a1) {
-    _mm_storeu_ps(out, a0);
-    _mm_storeu_ps(out + 4, a1);
+    W::storef(out, a0);
+    W::storef(out + kCount, a1);
   }
 };
 
@@ -210,28 +334,33 @@ template <> struct Lanes<float> {
 // pass, one rounding to float at the end; float for the column pass). A
 // block is two vectors, which keeps the double accumulators, the taps and
 // the temporaries in registers.
-template <typename Acc>
+template <typename Acc, typename Isa = simd::Sse2>
 struct FloatDataSum {
-  using L = Lanes<Acc>;
+  using W = Wide<Isa>;
+  using L = Lanes<Acc, W>;
   using Source = float;
   using Out = float;
   using V = typename L::V;
   using A = Acc;
+  using TapType = typename L::TapType;
+  using Prepared = typename L::Prepared;
   static constexpr int kBlock = 2 * L::kCount;
+  template <class I> FloatDataSum<Acc, I> to() const { return {}; }
   struct Tap {
     static A make(float tap, float) { return tap; }
     static V broadcast(A a) { return L::set1(a); }
+    static V prepared(const Prepared* p) { return L::prepared(p); }
     static A lane0(V v) { return L::lane0(v); }
   };
 
   template <class Src, class Taps>
   static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
-    const float* p = src.at(0) + i;
+    const auto* p = src.at(0) + i;
     V a0 = L::mul(taps.vec(0), L::load(p)), a1 = L::mul(taps.vec(0), L::load(p + L::kCount));
     for (int k = 1; k < n; ++k) {
       p = src.at(k) + i;
-      a0 = L::add(a0, L::mul(taps.vec(k), L::load(p)));
-      a1 = L::add(a1, L::mul(taps.vec(k), L::load(p + L::kCount)));
+      a0 = L::addProduct(a0, taps.vec(k), L::load(p));
+      a1 = L::addProduct(a1, taps.vec(k), L::load(p + L::kCount));
     }
     L::store(out, a0, a1);
   }
@@ -258,62 +387,73 @@ struct LowScale {
     return s;
   }
   // floor(sum * r / 2^14) saturated to 16 bits, the product taken exactly.
-  int16_t apply(int32_t sum) const {
+  template <class W> int16_t one(int32_t sum) const {
     int64_t v = unit ? sum : (static_cast<int64_t>(sum) * r) >> 14;
     return static_cast<int16_t>(v < -32768 ? -32768 : v > 32767 ? 32767 : v);
   }
-  // The same for four sums. The sum is split as hi * 2^16 + lo (lo unsigned)
-  // so that pmaddwd forms hi * r and lo * r exactly; then
+  // The same for a vector of sums. The sum is split as hi * 2^16 + lo (lo
+  // unsigned) so that pmaddwd forms hi * r and lo * r exactly; then
   // floor(sum * r / 2^14) = 4 * hi * r + floor(lo * r / 2^14). hi * r is
   // clamped to +-2^15 first, which cannot move a result across the 16-bit
   // saturation limits but keeps 4 * hi * r inside 32 bits. 2r fits 16 bits
   // because r = 16384 only arises from divisor 1, which skips r.
-  __m128i apply4(__m128i sum) const {
+  template <class W> typename W::I apply(typename W::I sum) const {
     if (unit) return sum;
-    const __m128i hiMul = _mm_set1_epi32(static_cast<int>(static_cast<uint32_t>(static_cast<uint16_t>(r)) << 16));
-    const __m128i loMul = _mm_set1_epi32(static_cast<int>(static_cast<uint16_t>(2 * r) |
-                                                          (static_cast<uint32_t>(static_cast<uint16_t>(r)) << 16)));
-    __m128i hr = _mm_madd_epi16(sum, hiMul);
-    __m128i loHalf = _mm_srli_epi32(_mm_slli_epi32(sum, 16), 17);
-    __m128i loBit = _mm_slli_epi32(_mm_and_si128(sum, _mm_set1_epi32(1)), 16);
-    __m128i lr = _mm_madd_epi16(_mm_or_si128(loHalf, loBit), loMul);
-    hr = simd::Vec<int32_t>::max(simd::Vec<int32_t>::min(hr, _mm_set1_epi32(32768)), _mm_set1_epi32(-32768));
-    return _mm_add_epi32(_mm_slli_epi32(hr, 2), _mm_srai_epi32(lr, 14));
+    const auto hiMul = W::set32(static_cast<int>(static_cast<uint32_t>(static_cast<uint16_t>(r)) << 16));
+    const auto loMul = W::set32(static_cast<int>(static_cast<uint16_t>(2 * r) |
+                                                 (static_cast<uint32_t>(static_cast<uint16_t>(r)) << 16)));
+    auto hr = W::madd16(sum, hiMul);
+    auto loHalf = W::template srli32<17>(W::template slli32<16>(sum));
+    auto loBit = W::template slli32<16>(W::bitAnd(sum, W::set32(1)));
+    auto lr = W::madd16(W::bitOr(loHalf, loBit), loMul);
+    hr = W::max32(W::min32(hr, W::set32(32768)), W::set32(-32768));
+    return W::add32(W::template slli32<2>(hr), W::template srai32<14>(lr));
   }
 };
 
+// Integer taps of the integer policies.
+template <class W>
+struct IntegerTap {
+  using V = typename W::I;
+  static int make(int16_t tap, float) { return tap; }
+  static V broadcast(int a) { return W::set16(a); }
+  static V prepared(const __m128i* p) { return W::tap16(p); }
+  static int lane0(V v) { return W::first16(v); }
+};
+
 // _Low 16s: integer products summed in 32 bits (wrapping), then LowScale.
+template <typename Isa = simd::Sse2>
 struct LowSum {
+  using W = Wide<Isa>;
   using Source = int16_t;
   using Out = int16_t;
-  using V = __m128i;
+  using V = typename W::I;
   using A = int;
-  static constexpr int kBlock = 8;
-  struct Tap {
-    static A make(int16_t tap, float) { return tap; }
-    static V broadcast(A a) { return _mm_set1_epi16(static_cast<short>(a)); }
-    static A lane0(V v) { return static_cast<int16_t>(_mm_cvtsi128_si32(v)); }
-  };
+  using TapType = int16_t;
+  using Prepared = __m128i;
+  using Tap = IntegerTap<W>;
+  static constexpr int kBlock = 2 * W::kFloats;
   LowScale scale;
+  template <class I> LowSum<I> to() const { return {scale}; }
 
   template <class Src, class Taps>
   void block(const Src& src, int i, int16_t* out, const Taps& taps, int n) const {
-    __m128i a0 = _mm_setzero_si128(), a1 = _mm_setzero_si128();
+    V a0 = W::zero(), a1 = W::zero();
     for (int k = 0; k < n; ++k) {
-      __m128i v = simd::Vec<int16_t>::loadu(src.at(k) + i);
-      const __m128i t = taps.vec(k);
-      __m128i lo = _mm_mullo_epi16(v, t), hi = _mm_mulhi_epi16(v, t);
-      a0 = _mm_add_epi32(a0, _mm_unpacklo_epi16(lo, hi));
-      a1 = _mm_add_epi32(a1, _mm_unpackhi_epi16(lo, hi));
+      V v = W::loadi(src.at(k) + i);
+      const V t = taps.vec(k);
+      V lo = W::mullo16(v, t), hi = W::mulhi16(v, t);
+      a0 = W::add32(a0, W::lo16(lo, hi));
+      a1 = W::add32(a1, W::hi16(lo, hi));
     }
-    simd::Vec<int16_t>::storeu(out, _mm_packs_epi32(scale.apply4(a0), scale.apply4(a1)));
+    W::storei(out, W::packs32(scale.template apply<W>(a0), scale.template apply<W>(a1)));
   }
 
   template <class Src, class Taps>
   int16_t one(const Src& src, int i, const Taps& t, int n) const {
     uint32_t acc = 0;  // wraps like the vector lanes
     for (int k = 0; k < n; ++k) acc += static_cast<uint32_t>(t.scalar(k) * src.at(k)[i]);
-    return scale.apply(static_cast<int32_t>(acc));
+    return scale.template one<W>(static_cast<int32_t>(acc));
   }
 };
 
@@ -334,21 +474,8 @@ inline bool exactInFloat(const int16_t* kernel, int count, int divisor, int64_t 
   return sum * maxAbs < (int64_t(1) << 24);
 }
 
-// Eight elements widened to 16-bit lanes (8-bit data is unsigned).
-inline __m128i load8x16(const uint8_t* p) {
-  return _mm_unpacklo_epi8(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p)), _mm_setzero_si128());
-}
-inline __m128i load8x16(const int16_t* p) { return simd::Vec<int16_t>::loadu(p); }
-
-// Integer taps for the exact policies (the accessor of their scalar tail).
-struct IntegerTap {
-  static int make(int16_t tap, float) { return tap; }
-  static __m128i broadcast(int a) { return _mm_set1_epi16(static_cast<short>(a)); }
-  static int lane0(__m128i v) { return static_cast<int16_t>(_mm_cvtsi128_si32(v)); }
-};
-
 // Converts exact integer sums to the output as FloatSum would.
-template <typename D, bool kRound>
+template <class W, typename D, bool kRound>
 inline D convertExact(int32_t sum, float scale) {
   float v = clampLikeVector(static_cast<float>(sum) * scale, Range<D>::lo, Range<D>::hi);
   return static_cast<D>(kRound ? _mm_cvtss_si32(_mm_set_ss(v)) : _mm_cvttss_si32(_mm_set_ss(v)));
@@ -356,29 +483,31 @@ inline D convertExact(int32_t sum, float scale) {
 // |sum| < 2^24, so sum x scale converts without overflow, and since the
 // clamp limits are integers, clamping before the conversion equals the
 // saturation of the packing stores after it.
-template <typename D, bool kRound>
-inline void storeExact(D* out, __m128i a0, __m128i a1, float scale) {
-  const __m128 f = _mm_set1_ps(scale);
-  __m128 v0 = _mm_mul_ps(_mm_cvtepi32_ps(a0), f);
-  __m128 v1 = _mm_mul_ps(_mm_cvtepi32_ps(a1), f);
+template <class W, typename D, bool kRound>
+inline void storeExact(D* out, typename W::I a0, typename W::I a1, float scale) {
+  const typename W::F f = W::setf(scale);
+  typename W::F v0 = W::mulf(W::toFloat(a0), f);
+  typename W::F v1 = W::mulf(W::toFloat(a1), f);
   if (kRound)
-    store8(out, _mm_cvtps_epi32(v0), _mm_cvtps_epi32(v1));
+    storePair<W>(out, W::roundToInt(v0), W::roundToInt(v1));
   else
-    store8(out, _mm_cvttps_epi32(v0), _mm_cvttps_epi32(v1));
+    storePair<W>(out, W::truncToInt(v0), W::truncToInt(v1));
 }
 
 // 32-bit sums from pmaddwd over pairs of taps: `pairs[j]` holds taps 2j and
 // 2j+1 in every 32-bit lane (the odd last tap pairs with 0).
-template <typename S, typename D, bool kRound>
+template <typename S, typename D, bool kRound, typename Isa = simd::Sse2>
 struct PairSum {
+  using W = Wide<Isa>;
   using Source = S;
   using Out = D;
-  using V = __m128i;
+  using V = typename W::I;
   using A = int;
-  using Tap = IntegerTap;
-  static constexpr int kBlock = 8;
+  using Tap = IntegerTap<W>;
+  static constexpr int kBlock = 2 * W::kFloats;
   const __m128i* pairs;
   float scale;
+  template <class I> PairSum<S, D, kRound, I> to() const { return {pairs, scale}; }
 
   static void preparePairs(const int16_t* kernel, int count, __m128i* pairs) {
     for (int k = 0; k < count; k += 2) {
@@ -390,80 +519,87 @@ struct PairSum {
 
   template <class Src, class Taps>
   void block(const Src& src, int i, D* out, const Taps&, int n) const {
-    __m128i a0 = _mm_setzero_si128(), a1 = _mm_setzero_si128();
+    V a0 = W::zero(), a1 = W::zero();
     int k = 0;
     for (; k + 1 < n; k += 2) {
-      __m128i p = load8x16(src.at(k) + i), q = load8x16(src.at(k + 1) + i);
-      a0 = _mm_add_epi32(a0, _mm_madd_epi16(_mm_unpacklo_epi16(p, q), pairs[k / 2]));
-      a1 = _mm_add_epi32(a1, _mm_madd_epi16(_mm_unpackhi_epi16(p, q), pairs[k / 2]));
+      const V p = to16<W>(src.at(k) + i), q = to16<W>(src.at(k + 1) + i), t = W::tap32(pairs + k / 2);
+      a0 = W::add32(a0, W::madd16(W::lo16(p, q), t));
+      a1 = W::add32(a1, W::madd16(W::hi16(p, q), t));
     }
     if (k < n) {
-      const __m128i zero = _mm_setzero_si128();
-      __m128i p = load8x16(src.at(k) + i);
-      a0 = _mm_add_epi32(a0, _mm_madd_epi16(_mm_unpacklo_epi16(p, zero), pairs[k / 2]));
-      a1 = _mm_add_epi32(a1, _mm_madd_epi16(_mm_unpackhi_epi16(p, zero), pairs[k / 2]));
+      const V p = to16<W>(src.at(k) + i), t = W::tap32(pairs + k / 2);
+      a0 = W::add32(a0, W::madd16(W::lo16(p, W::zero()), t));
+      a1 = W::add32(a1, W::madd16(W::hi16(p, W::zero()), t));
     }
-    storeExact<D, kRound>(out, a0, a1, scale);
+    storeExact<W, D, kRound>(out, a0, a1, scale);
   }
 
   template <class Src, class Taps>
   D one(const Src& src, int i, const Taps& t, int n) const {
     int32_t sum = 0;
     for (int k = 0; k < n; ++k) sum += t.scalar(k) * static_cast<int32_t>(src.at(k)[i]);
-    return convertExact<D, kRound>(sum, scale);
+    return convertExact<W, D, kRound>(sum, scale);
   }
 };
 
 // 8-bit rows into 16-bit results with 16-bit sums, for taps small enough
 // that sum|tap| x 255 fits 15 bits (then no product or sum can wrap).
+template <typename Isa = simd::Sse2>
 struct ShortSum {
+  using W = Wide<Isa>;
   using Source = uint8_t;
   using Out = int16_t;
-  using V = __m128i;
+  using V = typename W::I;
   using A = int;
-  using Tap = IntegerTap;
-  static constexpr int kBlock = 16;
+  using TapType = int16_t;
+  using Prepared = __m128i;
+  using Tap = IntegerTap<W>;
+  static constexpr int kHalf = 2 * W::kFloats;  // 16-bit lanes per vector
+  static constexpr int kBlock = 2 * kHalf;
   float scale;
   bool unit;  // divisor 1: the sum is the result
+  template <class I> ShortSum<I> to() const { return {scale, unit}; }
 
   template <class Src, class Taps>
   void block(const Src& src, int i, int16_t* out, const Taps& taps, int n) const {
-    const __m128i zero = _mm_setzero_si128();
-    __m128i a0 = zero, a1 = zero;
+    V a0 = W::zero(), a1 = W::zero();
     for (int k = 0; k < n; ++k) {
-      __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(src.at(k) + i));
-      const __m128i t = taps.vec(k);
-      a0 = _mm_add_epi16(a0, _mm_mullo_epi16(_mm_unpacklo_epi8(v, zero), t));
-      a1 = _mm_add_epi16(a1, _mm_mullo_epi16(_mm_unpackhi_epi8(v, zero), t));
+      V v0, v1;
+      W::widenBytes2(src.at(k) + i, v0, v1);
+      const V t = taps.vec(k);
+      a0 = W::add16(a0, W::mullo16(v0, t));
+      a1 = W::add16(a1, W::mullo16(v1, t));
     }
     if (unit) {
-      simd::Vec<int16_t>::storeu(out, a0);
-      simd::Vec<int16_t>::storeu(out + 8, a1);
+      W::storei(out, a0);
+      W::storei(out + kHalf, a1);
       return;
     }
-    storeExact<int16_t, false>(out, _mm_srai_epi32(_mm_unpacklo_epi16(a0, a0), 16),
-                               _mm_srai_epi32(_mm_unpackhi_epi16(a0, a0), 16), scale);
-    storeExact<int16_t, false>(out + 8, _mm_srai_epi32(_mm_unpacklo_epi16(a1, a1), 16),
-                               _mm_srai_epi32(_mm_unpackhi_epi16(a1, a1), 16), scale);
+    storeExact<W, int16_t, false>(out, W::template srai32<16>(W::lo16(a0, a0)),
+                                  W::template srai32<16>(W::hi16(a0, a0)), scale);
+    storeExact<W, int16_t, false>(out + kHalf, W::template srai32<16>(W::lo16(a1, a1)),
+                                  W::template srai32<16>(W::hi16(a1, a1)), scale);
   }
 
   template <class Src, class Taps>
   int16_t one(const Src& src, int i, const Taps& t, int n) const {
     int32_t sum = 0;
     for (int k = 0; k < n; ++k) sum += t.scalar(k) * static_cast<int32_t>(src.at(k)[i]);
-    return convertExact<int16_t, false>(sum, scale);
+    return convertExact<W, int16_t, false>(sum, scale);
   }
 };
 
 // ---- the span routine --------------------------------------------------------
 
-// n outputs of a kernel of `taps` taps; kKnown > 0 fixes the size at compile
-// time and keeps the taps in registers.
-template <int kKnown, class P, class Src, class Taps>
-void filterSpan(const P& policyRef, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+// n outputs of a kernel of `count` taps; kKnown > 0 fixes the size at
+// compile time and keeps the taps in registers.
+template <int kKnown, class P, class Src, class RawTaps>
+void filterSpan(const P& policyRef, const Src& src, typename P::Out* out, int n, const RawTaps& rawTaps,
+                int count) {
   // A local copy: stores to `out` cannot change it, so its fields stay in
   // registers across the loop.
   const P policy = policyRef;
+  const Bound<P, RawTaps> taps{rawTaps};
   int i = 0;
   if (kKnown > 0) {
     CachedTaps<P, (kKnown > 0 ? kKnown : 1)> cached;
@@ -489,15 +625,104 @@ void filterSpan(const P& policyRef, const Src& src, typename P::Out* out, int n,
 
 // The dedicated sizes 3 and 5, or the general path.
 template <class P, class Src, class Taps>
-void filterSpanAnySize(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps,
-                       int count) {
-  if (n <= 0) return;
+void spanSized(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
   if (count == 3)
     filterSpan<3>(policy, src, out, n, taps, count);
   else if (count == 5)
     filterSpan<5>(policy, src, out, n, taps, count);
   else
     filterSpan<0>(policy, src, out, n, taps, count);
+}
+
+// Float rows summed in double precision: each element is widened once into
+// a short run rather than once per tap, and the sums read the run. The
+// products and their order are unchanged. The caller provides the run
+// (kRunLength doubles; a local array here would need unwinding code in the
+// AVX2 objects under the sanitizers). False for kernels too long for it.
+constexpr int kRunChunk = 256, kRunReach = 64, kRunLength = kRunChunk + kRunReach;
+
+template <class P, class Taps>
+bool widenedRowSpan(const P& policy, const RowSource<float>& src, float* out, int n, const Taps& taps, int count,
+                    double* run) {
+  using W = typename P::W;
+  constexpr int kStep = W::kFloats / 2;
+  const int reach = (count - 1) * src.stride;
+  if (reach > kRunReach) return false;
+  for (int i = 0; i < n; i += kRunChunk) {
+    const int len = n - i < kRunChunk ? n - i : kRunChunk, total = len + reach;
+    const float* from = src.base + i;
+    int j = 0;
+    for (; j + kStep <= total; j += kStep) W::stored(run + j, W::widen(from + j));
+    for (; j < total; ++j) run[j] = from[j];
+    spanSized(policy, RowSource<double>{run, src.stride}, out + i, len, taps, count);
+  }
+  return true;
+}
+
+template <class P, class Src>
+constexpr bool kWidensRows = std::is_same<Src, RowSource<float>>::value && std::is_same<typename P::A, double>::value;
+
+// The span routine with the policy `p` (given in its SSE2 form) run on
+// instruction set Isa; `run` serves widenedRowSpan.
+template <class Isa, class P, class Src, class Taps>
+void spanWith(const P& p, const Src& src, typename P::Out* out, int n, const Taps& taps, int count, double* run) {
+  if (n <= 0) return;
+  const auto policy = p.template to<Isa>();
+  if constexpr (kWidensRows<P, Src>) {
+    if (widenedRowSpan(policy, src, out, n, taps, count, run)) return;
+  }
+  spanSized(policy, src, out, n, taps, count);
+}
+
+// The policies the pipeline members run, in their SSE2 form.
+using Row16s = FloatSum<int16_t, int16_t, false>;
+using Row16u = FloatSum<uint16_t, uint16_t, false>;
+using Row8u16s = FloatSum<uint8_t, int16_t, false>;
+using RowPairs16s = PairSum<int16_t, int16_t, false>;
+using RowPairs8u16s = PairSum<uint8_t, int16_t, false>;
+using Col16s = FloatSum<int16_t, int16_t, true>;
+using Col16s8s = FloatSum<int16_t, int8_t, true>;
+using Col16s8u = FloatSum<int16_t, uint8_t, true>;
+using Col16u = FloatSum<uint16_t, uint16_t, true>;
+using ColPairs16s = PairSum<int16_t, int16_t, true>;
+using ColPairs16s8s = PairSum<int16_t, int8_t, true>;
+using ColPairs16s8u = PairSum<int16_t, uint8_t, true>;
+
+// Every (policy, source, taps) the members use; X(Isa, P, Src, Taps).
+#define ZELCV_SEP_SPANS(X, Isa)                                      \
+  X(Isa, Row16s, RowSource<int16_t>, PreparedTaps<float>)           \
+  X(Isa, Row16u, RowSource<uint16_t>, PreparedTaps<float>)          \
+  X(Isa, Row8u16s, RowSource<uint8_t>, PreparedTaps<float>)         \
+  X(Isa, LowSum<>, RowSource<int16_t>, PreparedTaps<int16_t>)        \
+  X(Isa, ShortSum<>, RowSource<uint8_t>, PreparedTaps<int16_t>)      \
+  X(Isa, RowPairs16s, RowSource<int16_t>, ComputedTaps<int16_t>)     \
+  X(Isa, RowPairs8u16s, RowSource<uint8_t>, ComputedTaps<int16_t>)   \
+  X(Isa, DoubleSum, RowSource<float>, PreparedTaps<double>)         \
+  X(Isa, Col16s, ColumnSource<int16_t>, ComputedTaps<int16_t>)       \
+  X(Isa, Col16s8s, ColumnSource<int16_t>, ComputedTaps<int16_t>)     \
+  X(Isa, Col16s8u, ColumnSource<int16_t>, ComputedTaps<int16_t>)     \
+  X(Isa, Col16u, ColumnSource<uint16_t>, ComputedTaps<int16_t>)      \
+  X(Isa, ColPairs16s, ColumnSource<int16_t>, ComputedTaps<int16_t>)  \
+  X(Isa, ColPairs16s8s, ColumnSource<int16_t>, ComputedTaps<int16_t>) \
+  X(Isa, ColPairs16s8u, ColumnSource<int16_t>, ComputedTaps<int16_t>) \
+  X(Isa, LowSum<>, ColumnSource<int16_t>, ComputedTaps<int16_t>)     \
+  X(Isa, SingleSum, ColumnSource<float>, ComputedTaps<float>)
+
+#define ZELCV_SEP_SPAN(Isa, P, Src, Taps) \
+  void spanWith<Isa, P, Src, Taps>(const P&, const Src&, P::Out*, int, const Taps&, int, double*);
+#define ZELCV_SEP_EXTERN_SPAN(Isa, P, Src, Taps) extern template ZELCV_SEP_SPAN(Isa, P, Src, Taps)
+// Built in sepfilter_avx2.cpp.
+ZELCV_SEP_SPANS(ZELCV_SEP_EXTERN_SPAN, avx2::Isa)
+
+// The span routine on the instruction set chosen at load.
+template <class P, class Src, class Taps>
+void filterSpanAnySize(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+  double runSpace[kWidensRows<P, Src> ? kRunLength : 1];
+  double* run = runSpace;
+  if (useAvx2Kernels())
+    spanWith<avx2::Isa>(policy, src, out, n, taps, count, run);
+  else
+    spanWith<simd::Sse2>(policy, src, out, n, taps, count, run);
 }
 
 }  // namespace sep

@@ -98,6 +98,18 @@ TYPED_TEST(ColumnPipeline, MatchesReferenceForEverySizeWidthAndPointerPattern) {
       }
 }
 
+// Rows long enough for several vector blocks of either width and a partial
+// last block.
+TYPED_TEST(ColumnPipeline, MatchesReferenceOnWideRows) {
+  std::mt19937 rng(555 + TypeParam::channels);
+  for (int size = 1; size <= 9; ++size)
+    for (int round = 0; round < 4; ++round)
+      for (Pointers p : {Pointers::distinct, Pointers::randomRepeats}) {
+        checkColumnCase<TypeParam>(rng, size, 41 + int(rng() % 220), p);
+        if (::testing::Test::HasFatalFailure()) return;
+      }
+}
+
 template <class M>
 struct ColumnCall {
   using S = typename M::S;

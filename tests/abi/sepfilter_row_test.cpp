@@ -27,7 +27,7 @@ struct MemberName {
 };
 TYPED_TEST_SUITE(RowPipeline, RowMembers, MemberName);
 
-constexpr int kMargin = 10;  // real pixels on both sides of the ROI (> largest reach)
+constexpr int kMargin = 70;  // real pixels on both sides of the ROI (> largest reach)
 
 // One random image filtered by the member and by the reference; fails the
 // test on the first differing element.
@@ -112,6 +112,24 @@ TYPED_TEST(RowPipeline, MatchesReferenceForEverySizeAnchorWidthAndBorder) {
           checkRowCase<TypeParam>(rng, size, anchor, width, border);
           if (::testing::Test::HasFatalFailure()) return;
         }
+}
+
+// Rows long enough for several vector blocks of either width and a partial
+// last block, at every anchor.
+TYPED_TEST(RowPipeline, MatchesReferenceOnWideRows) {
+  std::mt19937 rng(777 + TypeParam::channels);
+  for (int size = 1; size <= 9; ++size)
+    for (int anchor = 0; anchor < size; ++anchor)
+      for (ZeliBorderType border : {zelBorderConstant, zelBorderReplicate, zelBorderInMemory}) {
+        checkRowCase<TypeParam>(rng, size, anchor, 41 + int(rng() % 220), border);
+        if (::testing::Test::HasFatalFailure()) return;
+      }
+  // Kernels longer than the runs that float rows are widened into.
+  for (int size : {22, 23, 66, 67})
+    for (ZeliBorderType border : {zelBorderConstant, zelBorderReplicate, zelBorderInMemory}) {
+      checkRowCase<TypeParam>(rng, size, int(rng() % size), 1 + int(rng() % 300), border);
+      if (::testing::Test::HasFatalFailure()) return;
+    }
 }
 
 // A valid call that the check tests break one argument at a time.

@@ -108,9 +108,9 @@ TEST(LoadRoutine, ActsOnProcessAttachOnlyAndAlwaysSucceeds) {
     uint32_t mask;
     int flag;
     bool avx2;
-  } cases[] = {{0x30, 1, false}, {0xFFFFFFFF, 1, true}, {0x10, 0, false}, {0x20, 0, false},
-               {0, 0, false},    {0x3F, 1, false},      {0x500, 0, true},  {0x400, 0, false},
-               {0x100, 0, false}};
+  } cases[] = {{0x30, 1, false}, {0xFFFFFFFF, 1, true}, {0x10, 0, false},  {0x20, 0, false},
+               {0, 0, false},    {0x3F, 1, false},      {0x700, 0, true},   {0x500, 0, false},
+               {0x600, 0, false}, {0x300, 0, false},    {0x400, 0, false}};
   for (const Case& c : cases) {
     zeltest::FaultInjection faults;
     faults.setCpuFeatures(c.mask);
