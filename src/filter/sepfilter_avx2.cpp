@@ -33,8 +33,6 @@ template <> struct Wide<avx2::Isa> {
   static D addExactProductd(D acc, D a, D b) { return _mm256_fmadd_pd(a, b, acc); }
   static double firstd(D a) { return _mm256_cvtsd_f64(a); }
   static D widen(const float* p) { return _mm256_cvtps_pd(_mm_loadu_ps(p)); }
-  static D loadd(const double* p) { return _mm256_loadu_pd(p); }
-  static void stored(double* p, D a) { _mm256_storeu_pd(p, a); }
   static void storeNarrowed(float* p, D a0, D a1) {
     _mm256_storeu_ps(p, _mm256_insertf128_ps(_mm256_castps128_ps256(_mm256_cvtpd_ps(a0)), _mm256_cvtpd_ps(a1), 1));
   }

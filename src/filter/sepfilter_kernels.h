@@ -16,8 +16,6 @@
 #include <emmintrin.h>
 #include <stdint.h>
 
-#include <type_traits>
-
 #include "core/load.h"
 #include "kernels/simd.h"
 
@@ -97,8 +95,6 @@ template <> struct Wide<simd::Sse2> {
   }
   // Two vectors of doubles rounded to kFloats floats.
   static void storeNarrowed(float* p, D a0, D a1) { _mm_storeu_ps(p, _mm_movelh_ps(_mm_cvtpd_ps(a0), _mm_cvtpd_ps(a1))); }
-  static D loadd(const double* p) { return _mm_loadu_pd(p); }
-  static void stored(double* p, D a) { _mm_storeu_pd(p, a); }
 
   static I zero() { return _mm_setzero_si128(); }
   static I set16(int a) { return _mm_set1_epi16(static_cast<short>(a)); }
@@ -304,7 +300,6 @@ template <class W> struct Lanes<double, W> {
   using Prepared = __m128d;
   static constexpr int kCount = W::kFloats / 2;
   static V load(const float* p) { return W::widen(p); }
-  static V load(const double* p) { return W::loadd(p); }
   static V mul(V a, V b) { return W::muld(a, b); }
   // acc + a x b for a float tap and a float pixel widened to double.
   static V addProduct(V acc, V a, V b) { return W::addExactProductd(acc, a, b); }
@@ -332,19 +327,19 @@ template <class W> struct Lanes<float, W> {
 
 // 32f members: no divisor; products and sum in `Acc` (double for the row
 // pass, one rounding to float at the end; float for the column pass). A
-// block is two vectors, which keeps the double accumulators, the taps and
-// the temporaries in registers.
+// block is four vectors: four independent chains of additions keep the
+// adders busy despite their latency, and the sums, the tap and a temporary
+// still fit in the eight registers of 32-bit code.
 template <typename Acc, typename Isa = simd::Sse2>
 struct FloatDataSum {
-  using W = Wide<Isa>;
-  using L = Lanes<Acc, W>;
+  using L = Lanes<Acc, Wide<Isa>>;
   using Source = float;
   using Out = float;
   using V = typename L::V;
   using A = Acc;
   using TapType = typename L::TapType;
   using Prepared = typename L::Prepared;
-  static constexpr int kBlock = 2 * L::kCount;
+  static constexpr int kBlock = 4 * L::kCount;
   template <class I> FloatDataSum<Acc, I> to() const { return {}; }
   struct Tap {
     static A make(float tap, float) { return tap; }
@@ -355,14 +350,20 @@ struct FloatDataSum {
 
   template <class Src, class Taps>
   static void block(const Src& src, int i, float* out, const Taps& taps, int n) {
-    const auto* p = src.at(0) + i;
-    V a0 = L::mul(taps.vec(0), L::load(p)), a1 = L::mul(taps.vec(0), L::load(p + L::kCount));
+    const float* p = src.at(0) + i;
+    V t = taps.vec(0);
+    V a0 = L::mul(t, L::load(p)), a1 = L::mul(t, L::load(p + L::kCount));
+    V a2 = L::mul(t, L::load(p + 2 * L::kCount)), a3 = L::mul(t, L::load(p + 3 * L::kCount));
     for (int k = 1; k < n; ++k) {
       p = src.at(k) + i;
-      a0 = L::addProduct(a0, taps.vec(k), L::load(p));
-      a1 = L::addProduct(a1, taps.vec(k), L::load(p + L::kCount));
+      t = taps.vec(k);
+      a0 = L::addProduct(a0, t, L::load(p));
+      a1 = L::addProduct(a1, t, L::load(p + L::kCount));
+      a2 = L::addProduct(a2, t, L::load(p + 2 * L::kCount));
+      a3 = L::addProduct(a3, t, L::load(p + 3 * L::kCount));
     }
     L::store(out, a0, a1);
+    L::store(out + 2 * L::kCount, a2, a3);
   }
 
   template <class Src, class Taps>
@@ -623,55 +624,18 @@ void filterSpan(const P& policyRef, const Src& src, typename P::Out* out, int n,
   }
 }
 
-// The dedicated sizes 3 and 5, or the general path.
-template <class P, class Src, class Taps>
-void spanSized(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+// The dedicated sizes 3 and 5, or the general path, with the policy `p`
+// (given in its SSE2 form) run on instruction set Isa.
+template <class Isa, class P, class Src, class Taps>
+void spanWith(const P& p, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+  if (n <= 0) return;
+  const auto policy = p.template to<Isa>();
   if (count == 3)
     filterSpan<3>(policy, src, out, n, taps, count);
   else if (count == 5)
     filterSpan<5>(policy, src, out, n, taps, count);
   else
     filterSpan<0>(policy, src, out, n, taps, count);
-}
-
-// Float rows summed in double precision: each element is widened once into
-// a short run rather than once per tap, and the sums read the run. The
-// products and their order are unchanged. The caller provides the run
-// (kRunLength doubles; a local array here would need unwinding code in the
-// AVX2 objects under the sanitizers). False for kernels too long for it.
-constexpr int kRunChunk = 256, kRunReach = 64, kRunLength = kRunChunk + kRunReach;
-
-template <class P, class Taps>
-bool widenedRowSpan(const P& policy, const RowSource<float>& src, float* out, int n, const Taps& taps, int count,
-                    double* run) {
-  using W = typename P::W;
-  constexpr int kStep = W::kFloats / 2;
-  const int reach = (count - 1) * src.stride;
-  if (reach > kRunReach) return false;
-  for (int i = 0; i < n; i += kRunChunk) {
-    const int len = n - i < kRunChunk ? n - i : kRunChunk, total = len + reach;
-    const float* from = src.base + i;
-    int j = 0;
-    for (; j + kStep <= total; j += kStep) W::stored(run + j, W::widen(from + j));
-    for (; j < total; ++j) run[j] = from[j];
-    spanSized(policy, RowSource<double>{run, src.stride}, out + i, len, taps, count);
-  }
-  return true;
-}
-
-template <class P, class Src>
-constexpr bool kWidensRows = std::is_same<Src, RowSource<float>>::value && std::is_same<typename P::A, double>::value;
-
-// The span routine with the policy `p` (given in its SSE2 form) run on
-// instruction set Isa; `run` serves widenedRowSpan.
-template <class Isa, class P, class Src, class Taps>
-void spanWith(const P& p, const Src& src, typename P::Out* out, int n, const Taps& taps, int count, double* run) {
-  if (n <= 0) return;
-  const auto policy = p.template to<Isa>();
-  if constexpr (kWidensRows<P, Src>) {
-    if (widenedRowSpan(policy, src, out, n, taps, count, run)) return;
-  }
-  spanSized(policy, src, out, n, taps, count);
 }
 
 // The policies the pipeline members run, in their SSE2 form.
@@ -709,7 +673,7 @@ using ColPairs16s8u = PairSum<int16_t, uint8_t, true>;
   X(Isa, SingleSum, ColumnSource<float>, ComputedTaps<float>)
 
 #define ZELCV_SEP_SPAN(Isa, P, Src, Taps) \
-  void spanWith<Isa, P, Src, Taps>(const P&, const Src&, P::Out*, int, const Taps&, int, double*);
+  void spanWith<Isa, P, Src, Taps>(const P&, const Src&, P::Out*, int, const Taps&, int);
 #define ZELCV_SEP_EXTERN_SPAN(Isa, P, Src, Taps) extern template ZELCV_SEP_SPAN(Isa, P, Src, Taps)
 // Built in sepfilter_avx2.cpp.
 ZELCV_SEP_SPANS(ZELCV_SEP_EXTERN_SPAN, avx2::Isa)
@@ -717,12 +681,10 @@ ZELCV_SEP_SPANS(ZELCV_SEP_EXTERN_SPAN, avx2::Isa)
 // The span routine on the instruction set chosen at load.
 template <class P, class Src, class Taps>
 void filterSpanAnySize(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
-  double runSpace[kWidensRows<P, Src> ? kRunLength : 1];
-  double* run = runSpace;
   if (useAvx2Kernels())
-    spanWith<avx2::Isa>(policy, src, out, n, taps, count, run);
+    spanWith<avx2::Isa>(policy, src, out, n, taps, count);
   else
-    spanWith<simd::Sse2>(policy, src, out, n, taps, count, run);
+    spanWith<simd::Sse2>(policy, src, out, n, taps, count);
 }
 
 }  // namespace sep
