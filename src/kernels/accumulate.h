@@ -218,12 +218,12 @@ class Row {
   void block(int x) {
     if (kSources == 2 || kMasked) {
       // With three or four streams to read, the hardware prefetchers alone
-      // leave the memory idle between requests: ask ahead, a line of each
-      // stream per 64 bytes of accumulator (no fault past the end).
-      for (int i = 0; i < kBlock; i += 16) prefetch(acc_ + x + i + kPrefetchAhead);
-      prefetch(src1_ + x + kPrefetchAhead);
-      if (kSources == 2) prefetch(src2_ + x + kPrefetchAhead);
-      if (kMasked) prefetch(mask_ + x + kPrefetchAhead);
+      // leave the memory idle between requests: ask ahead, every line of
+      // each stream that a block spans (no fault past the end).
+      prefetch(acc_ + x);
+      prefetch(src1_ + x);
+      if (kSources == 2) prefetch(src2_ + x);
+      if (kMasked) prefetch(mask_ + x);
     }
     update<Block, M>(x);
   }
@@ -240,7 +240,11 @@ class Row {
       Formula::kProduct && sizeof(Src) == 1 && (std::is_unsigned<Src>::value || kSources == 1);
 
   static constexpr int kPrefetchAhead = 256;  // pixels
-  static void prefetch(const void* p) { _mm_prefetch(static_cast<const char*>(p), _MM_HINT_T0); }
+  template <typename T>
+  static void prefetch(const T* p) {
+    for (int i = 0; i < kBlock; i += 64 / int(sizeof(T)))
+      _mm_prefetch(reinterpret_cast<const char*>(p + kPrefetchAhead + i), _MM_HINT_T0);
+  }
 
   const Src* second() const { return kSources == 2 ? src2_ : src1_; }
 
