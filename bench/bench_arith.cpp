@@ -1,5 +1,5 @@
 // Accumulation ("accumulate") and absolute differences ("absdiff") against
-// OpenCV's accumulate* and absdiff, for 8u and 32f sources at every size.
+// OpenCV's accumulate* and absdiff, for 8u, 16u and 32f sources at every size.
 // Bytes processed count every byte read and written (an in-place
 // accumulator twice), so the bandwidth compares with the copy baseline.
 #include <opencv2/imgproc.hpp>
@@ -21,6 +21,7 @@ using zelbench::stepOf;
 // and the written image.
 struct Images {
   cv::Mat src1, src2, mask, out;
+  int frames = 0;
   Images(const zelbench::Size& s, int srcType, int outType)
       : src1(randomMat(s.width, s.height, srcType, 1)),
         src2(randomMat(s.width, s.height, srcType, 2)),
@@ -28,6 +29,12 @@ struct Images {
         out(randomMat(s.width, s.height, outType, 4)) {
     cv::threshold(mask, mask, 120, 255, cv::THRESH_BINARY);
   }
+  // The next frame of a running average: the two sources in turn, as a
+  // changing scene gives. Averaging one frame over and over would drive the
+  // pixels where it is 0 into subnormal numbers after some hundred calls, so
+  // that each side's timing would depend on how many calls it happened to
+  // make before measuring.
+  const cv::Mat& frame() { return (frames++ & 1) ? src2 : src1; }
 };
 
 template <typename T>
@@ -80,16 +87,18 @@ void registerArith() {
           [](Images& m) { cv::accumulateProduct(m.src1, m.src2, m.out, m.mask); });
   addCase("accumulate", "AddWeighted_8u32f_C1IR", CV_8UC1, CV_32FC1, 9,
           [](Images& m) {
-            zeliAddWeighted_8u32f_C1IR(in<Zel8u>(m.src1), stepOf(m.src1), m.out.ptr<Zel32f>(), stepOf(m.out),
+            const cv::Mat& f = m.frame();
+            zeliAddWeighted_8u32f_C1IR(in<Zel8u>(f), stepOf(f), m.out.ptr<Zel32f>(), stepOf(m.out),
                                        roiOf(m.out), kAlpha);
           },
-          [](Images& m) { cv::accumulateWeighted(m.src1, m.out, kAlpha); });
+          [](Images& m) { cv::accumulateWeighted(m.frame(), m.out, kAlpha); });
   addCase("accumulate", "AddWeighted_8u32f_C1IMR", CV_8UC1, CV_32FC1, 10,
           [](Images& m) {
-            zeliAddWeighted_8u32f_C1IMR(in<Zel8u>(m.src1), stepOf(m.src1), in<Zel8u>(m.mask), stepOf(m.mask),
+            const cv::Mat& f = m.frame();
+            zeliAddWeighted_8u32f_C1IMR(in<Zel8u>(f), stepOf(f), in<Zel8u>(m.mask), stepOf(m.mask),
                                         m.out.ptr<Zel32f>(), stepOf(m.out), roiOf(m.out), kAlpha);
           },
-          [](Images& m) { cv::accumulateWeighted(m.src1, m.out, kAlpha, m.mask); });
+          [](Images& m) { cv::accumulateWeighted(m.frame(), m.out, kAlpha, m.mask); });
 
   // ---- accumulate: 32f sources (Add exists only masked) ----
   addCase("accumulate", "Add_32f_C1IMR", CV_32FC1, CV_32FC1, 13,
@@ -116,18 +125,58 @@ void registerArith() {
           [](Images& m) { cv::accumulateProduct(m.src1, m.src2, m.out, m.mask); });
   addCase("accumulate", "AddWeighted_32f_C1IR", CV_32FC1, CV_32FC1, 12,
           [](Images& m) {
-            zeliAddWeighted_32f_C1IR(in<Zel32f>(m.src1), stepOf(m.src1), m.out.ptr<Zel32f>(), stepOf(m.out),
+            const cv::Mat& f = m.frame();
+            zeliAddWeighted_32f_C1IR(in<Zel32f>(f), stepOf(f), m.out.ptr<Zel32f>(), stepOf(m.out),
                                      roiOf(m.out), kAlpha);
           },
-          [](Images& m) { cv::accumulateWeighted(m.src1, m.out, kAlpha); });
+          [](Images& m) { cv::accumulateWeighted(m.frame(), m.out, kAlpha); });
   addCase("accumulate", "AddWeighted_32f_C1IMR", CV_32FC1, CV_32FC1, 13,
           [](Images& m) {
-            zeliAddWeighted_32f_C1IMR(in<Zel32f>(m.src1), stepOf(m.src1), in<Zel8u>(m.mask), stepOf(m.mask),
+            const cv::Mat& f = m.frame();
+            zeliAddWeighted_32f_C1IMR(in<Zel32f>(f), stepOf(f), in<Zel8u>(m.mask), stepOf(m.mask),
                                       m.out.ptr<Zel32f>(), stepOf(m.out), roiOf(m.out), kAlpha);
           },
-          [](Images& m) { cv::accumulateWeighted(m.src1, m.out, kAlpha, m.mask); });
+          [](Images& m) { cv::accumulateWeighted(m.frame(), m.out, kAlpha, m.mask); });
+
+  // ---- accumulate: 16u sources, and the running average into another image ----
+  addCase("accumulate", "Add_16u32f_C1IR", CV_16UC1, CV_32FC1, 10,
+          [](Images& m) { zeliAdd_16u32f_C1IR(in<Zel16u>(m.src1), stepOf(m.src1), m.out.ptr<Zel32f>(), stepOf(m.out), roiOf(m.out)); },
+          [](Images& m) { cv::accumulate(m.src1, m.out); });
+  addCase("accumulate", "AddProduct_16u32f_C1IMR", CV_16UC1, CV_32FC1, 13,
+          [](Images& m) {
+            zeliAddProduct_16u32f_C1IMR(in<Zel16u>(m.src1), stepOf(m.src1), in<Zel16u>(m.src2), stepOf(m.src2),
+                                        in<Zel8u>(m.mask), stepOf(m.mask), m.out.ptr<Zel32f>(), stepOf(m.out),
+                                        roiOf(m.out));
+          },
+          [](Images& m) { cv::accumulateProduct(m.src1, m.src2, m.out, m.mask); });
+  addCase("accumulate", "AddWeighted_16u32f_C1IR", CV_16UC1, CV_32FC1, 10,
+          [](Images& m) {
+            const cv::Mat& f = m.frame();
+            zeliAddWeighted_16u32f_C1IR(in<Zel16u>(f), stepOf(f), m.out.ptr<Zel32f>(), stepOf(m.out), roiOf(m.out),
+                                        kAlpha);
+          },
+          [](Images& m) { cv::accumulateWeighted(m.frame(), m.out, kAlpha); });
+  // The comparison library blends with two weights; the same job.
+  addCase("accumulate", "AddWeighted_32f_C1R", CV_32FC1, CV_32FC1, 12,
+          [](Images& m) {
+            zeliAddWeighted_32f_C1R(in<Zel32f>(m.src1), stepOf(m.src1), in<Zel32f>(m.src2), stepOf(m.src2),
+                                    m.out.ptr<Zel32f>(), stepOf(m.out), roiOf(m.out), kAlpha);
+          },
+          [](Images& m) { cv::addWeighted(m.src1, kAlpha, m.src2, 1.0 - kAlpha, 0.0, m.out); });
 
   // ---- absdiff ----
+  addCase("absdiff", "AbsDiff_16u_C1R", CV_16UC1, CV_16UC1, 6,
+          [](Images& m) {
+            zeliAbsDiff_16u_C1R(in<Zel16u>(m.src1), stepOf(m.src1), in<Zel16u>(m.src2), stepOf(m.src2),
+                                m.out.ptr<Zel16u>(), stepOf(m.out), roiOf(m.out));
+          },
+          [](Images& m) { cv::absdiff(m.src1, m.src2, m.out); });
+  addCase("absdiff", "AbsDiff_8u_C3R", CV_8UC3, CV_8UC3, 9,
+          [](Images& m) {
+            zeliAbsDiff_8u_C3R(in<Zel8u>(m.src1), stepOf(m.src1), in<Zel8u>(m.src2), stepOf(m.src2),
+                               m.out.ptr<Zel8u>(), stepOf(m.out), roiOf(m.out));
+          },
+          [](Images& m) { cv::absdiff(m.src1, m.src2, m.out); });
   addCase("absdiff", "AbsDiff_8u_C1R", CV_8UC1, CV_8UC1, 3,
           [](Images& m) {
             zeliAbsDiff_8u_C1R(in<Zel8u>(m.src1), stepOf(m.src1), in<Zel8u>(m.src2), stepOf(m.src2),

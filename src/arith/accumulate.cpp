@@ -1,11 +1,20 @@
 // Add, AddSquare, AddProduct and AddWeighted: updates of a 32f accumulator
 // from 8u, 8s, 16u or 32f sources, plain or under a mask.
 #include "arith/store_mode.h"
+#include "core/load.h"
 #include "core/status.h"
 #include "kernels/accumulate.h"
 
 namespace zelcv {
 namespace {
+
+template <int kSources, bool kMasked, bool kInPlace, typename Src, typename Formula>
+void run(StoreMode mode, const accumulate::Images<Src>& images, ZeliSize roi, Formula f) {
+  if (useAvx2Kernels())
+    accumulate::run<kSources, kMasked, kInPlace, Src, Formula, avx2::Isa>(mode, images, roi.width, roi.height, f);
+  else
+    accumulate::run<kSources, kMasked, kInPlace, Src, Formula, simd::Sse2>(mode, images, roi.width, roi.height, f);
+}
 
 constexpr int kSinglePath = 0;  // no cache query, ordinary stores
 
@@ -29,7 +38,7 @@ ZelStatus update(const Src* src1, int src1Step, const Src* src2, int src2Step, c
 
   StoreMode mode = bytesPerPixel ? chooseStoreMode(bytesPerPixel, roi) : StoreMode::Ordinary;
   accumulate::Images<Src> images{{src1, src1Step}, {src2, src2Step}, {mask, maskStep}, {acc, accStep}, {acc, accStep}};
-  accumulate::run<kSources, kMasked, true>(mode, images, roi.width, roi.height, f);
+  run<kSources, kMasked, true>(mode, images, roi, f);
   return zelStatusOk;
 }
 
@@ -50,6 +59,7 @@ ZelStatus update1Masked(const Src* src, int srcStep, const Zel8u* mask, int mask
 }  // namespace zelcv
 
 using zelcv::kSinglePath;
+using zelcv::run;
 using zelcv::update;
 using zelcv::update1;
 using zelcv::update1Masked;
@@ -138,7 +148,6 @@ ZELCV_ENTRY(zeliAddWeighted_32f_C1R)(const Zel32f* src1, int src1Step, const Zel
   if (ZelStatus s = checkImages({image(src1, src1Step), image(src2, src2Step), image(dst, dstStep)}, roiSize))
     return s;
   accumulate::Images<Zel32f> images{{src1, src1Step}, {nullptr, 0}, {nullptr, 0}, {src2, src2Step}, {dst, dstStep}};
-  accumulate::run<1, false, false>(StoreMode::Ordinary, images, roiSize.width, roiSize.height,
-                                   accumulate::AddWeighted{alpha});
+  run<1, false, false>(StoreMode::Ordinary, images, roiSize, accumulate::AddWeighted{alpha});
   return zelStatusOk;
 }

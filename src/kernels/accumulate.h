@@ -1,6 +1,13 @@
 // Kernels that update a 32f accumulator from one or two sources: a formula
-// (one scalar and one vector form, the same single-precision operations in
-// the same order) applied per pixel, optionally under an 8u mask.
+// (written once over a vector type, so that single pixels, 128-bit parts and
+// full-width blocks get the same single-precision operations in the same
+// order) applied per pixel, optionally under an 8u mask.
+//
+// Blocks use the instruction set's full width through Kit<Isa>: the
+// conversions of source elements to floats, exact 8-bit products and mask
+// lanes. The 128-bit parts use Quad<Isa>. Both are templates over the
+// instruction set even where the code is the same, so that an AVX2 file's
+// copies keep names of their own.
 #ifndef ZELCV_KERNELS_ACCUMULATE_H
 #define ZELCV_KERNELS_ACCUMULATE_H
 
@@ -13,141 +20,186 @@
 #include "kernels/simd.h"
 
 namespace zelcv {
+namespace avx2 {
+struct Isa;
+}
 namespace accumulate {
+
+// Single floats with the operations of a vector type.
+template <typename Isa> struct Scalar {
+  using Raw = float;
+  static float add(float a, float b) { return a + b; }
+  static float sub(float a, float b) { return a - b; }
+  static float mul(float a, float b) { return a * b; }
+  static float set1(float v) { return v; }
+};
+
+// ---- 128-bit helpers --------------------------------------------------------
+
+template <typename Isa> struct Sse {
+  static __m128i loadu(const void* p) { return _mm_loadu_si128(static_cast<const __m128i*>(p)); }
+  static __m128i load4(const void* p) {
+    int32_t bits;
+    memcpy(&bits, p, 4);
+    return _mm_cvtsi32_si128(bits);
+  }
+  static __m128i load8(const void* p) { return _mm_loadl_epi64(static_cast<const __m128i*>(p)); }
+  // The old bits where `keep` is set, the new value elsewhere.
+  static __m128 select(__m128 keep, __m128 old, __m128 updated) {
+    return _mm_or_ps(_mm_and_ps(keep, old), _mm_andnot_ps(keep, updated));
+  }
+  // 32-bit lanes of all ones for the mask bytes that are zero (pixels kept),
+  // from four mask bytes in the low lanes of `zero` (0xFF where zero).
+  static __m128 keepLow(__m128i zero) {
+    zero = _mm_unpacklo_epi8(zero, zero);
+    return _mm_castsi128_ps(_mm_unpacklo_epi16(zero, zero));
+  }
+};
 
 // Widening of integer lanes: bytes to 16-bit lanes (lo16, hi16: the low and
 // high eight of sixteen), and 16-bit lanes to floats (lo, hi: the low and
 // high four of eight). All exact.
-template <typename T> struct Widen;
-
-template <> struct Widen<uint8_t> {
+template <typename T, typename Isa> struct Widen {
   static __m128i lo16(__m128i v) { return _mm_unpacklo_epi8(v, _mm_setzero_si128()); }
   static __m128i hi16(__m128i v) { return _mm_unpackhi_epi8(v, _mm_setzero_si128()); }
   static __m128 lo(__m128i v) { return _mm_cvtepi32_ps(_mm_unpacklo_epi16(v, _mm_setzero_si128())); }
   static __m128 hi(__m128i v) { return _mm_cvtepi32_ps(_mm_unpackhi_epi16(v, _mm_setzero_si128())); }
 };
-template <> struct Widen<uint16_t> : Widen<uint8_t> {};
 
 // Sign extension: the value lands in the high half of a wider lane, then an
 // arithmetic shift brings it down.
-template <> struct Widen<int8_t> {
+template <typename Isa> struct Widen<int8_t, Isa> {
   static __m128i lo16(__m128i v) { return _mm_srai_epi16(_mm_unpacklo_epi8(v, v), 8); }
   static __m128i hi16(__m128i v) { return _mm_srai_epi16(_mm_unpackhi_epi8(v, v), 8); }
   static __m128 lo(__m128i v) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(v, v), 16)); }
   static __m128 hi(__m128i v) { return _mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpackhi_epi16(v, v), 16)); }
 };
 
-// Sixteen 16-bit lanes (two vectors) as four float vectors.
-template <typename T>
-inline void toFloats(__m128i low, __m128i high, __m128 out[4]) {
-  out[0] = Widen<T>::lo(low);
-  out[1] = Widen<T>::hi(low);
-  out[2] = Widen<T>::lo(high);
-  out[3] = Widen<T>::hi(high);
-}
+// Four floats, named after the instruction set of the file that uses them.
+template <typename Isa> struct QuadVec : simd::Vec<float> {};
 
-inline __m128i loadu(const void* p) { return _mm_loadu_si128(static_cast<const __m128i*>(p)); }
-inline __m128i load4Bytes(const void* p) {
-  int32_t bits;
-  memcpy(&bits, p, 4);
-  return _mm_cvtsi32_si128(bits);
-}
-
-// Exact conversion of source elements to single precision: four (a vector
-// part) or sixteen (a block, as four vectors). Bytes first.
-template <typename T> struct ToFloat {
-  static void block(const T* p, __m128 out[4]) {
-    __m128i v = loadu(p);
-    toFloats<T>(Widen<T>::lo16(v), Widen<T>::hi16(v), out);
-  }
-  static __m128 part(const T* p) { return Widen<T>::lo(Widen<T>::lo16(load4Bytes(p))); }
-};
-
-template <> struct ToFloat<uint16_t> {
-  static void block(const uint16_t* p, __m128 out[4]) { toFloats<uint16_t>(loadu(p), loadu(p + 8), out); }
-  static __m128 part(const uint16_t* p) {
-    return Widen<uint16_t>::lo(_mm_loadl_epi64(static_cast<const __m128i*>(static_cast<const void*>(p))));
-  }
-};
-
-template <> struct ToFloat<float> {
-  static void block(const float* p, __m128 out[4]) {
-    for (int i = 0; i < 4; ++i) out[i] = _mm_loadu_ps(p + 4 * i);
-  }
-  static __m128 part(const float* p) { return _mm_loadu_ps(p); }
-};
-
-// Products of 8-bit sources, formed exactly in 16-bit lanes and then
-// converted: they stay below 2^24, so they equal the single-precision product
-// of the converted sources (signed zeros aside), at a fraction of the
+// Four pixels as one vector: the vector parts of a row, whatever the
+// instruction set of its blocks.
+//
+// exactProducts: products of 8-bit sources formed exactly in integer lanes.
+// They stay below 2^24, so once converted they equal the single-precision
+// product of the converted sources (signed zeros aside), at a fraction of the
 // conversions.
-template <typename T>
-inline void exactProducts(const T* p1, const T* p2, __m128 out[4]) {
-  using W = Widen<T>;
-  __m128i a = loadu(p1), b = loadu(p2);
-  toFloats<T>(_mm_mullo_epi16(W::lo16(a), W::lo16(b)), _mm_mullo_epi16(W::hi16(a), W::hi16(b)), out);
-}
-template <typename T>
-inline __m128 exactProducts(const T* p1, const T* p2) {
-  using W = Widen<T>;
-  return W::lo(_mm_mullo_epi16(W::lo16(load4Bytes(p1)), W::lo16(load4Bytes(p2))));
-}
+template <typename Isa> struct Quad {
+  using V = QuadVec<Isa>;
+  using S = Sse<Isa>;
+  static constexpr int kVectors = 1;
 
-// Lane masks that select the pixels whose mask byte is zero (kept as they
-// were): all ones in the 32-bit lane of such a pixel.
-// `zero` holds 0xFF for each mask byte that is zero.
-inline void keepLanes(__m128i zero, __m128 keep[4]) {
-  __m128i l = _mm_unpacklo_epi8(zero, zero), h = _mm_unpackhi_epi8(zero, zero);
-  keep[0] = _mm_castsi128_ps(_mm_unpacklo_epi16(l, l));
-  keep[1] = _mm_castsi128_ps(_mm_unpackhi_epi16(l, l));
-  keep[2] = _mm_castsi128_ps(_mm_unpacklo_epi16(h, h));
-  keep[3] = _mm_castsi128_ps(_mm_unpackhi_epi16(h, h));
-}
-inline __m128 keepLanes(const uint8_t* mask) {
-  __m128i zero = _mm_cmpeq_epi8(load4Bytes(mask), _mm_setzero_si128());
-  zero = _mm_unpacklo_epi8(zero, zero);
-  return _mm_castsi128_ps(_mm_unpacklo_epi16(zero, zero));
-}
-// The old bits where `keep` is set, the new value elsewhere.
-inline __m128 select(__m128 keep, __m128 old, __m128 updated) {
-  return _mm_or_ps(_mm_and_ps(keep, old), _mm_andnot_ps(keep, updated));
-}
+  template <typename T>
+  static void toFloat(const T* p, __m128 out[1]) {
+    if constexpr (std::is_same<T, float>::value)
+      out[0] = _mm_loadu_ps(p);
+    else if constexpr (sizeof(T) == 2)
+      out[0] = Widen<T, Isa>::lo(S::load8(p));
+    else
+      out[0] = Widen<T, Isa>::lo(Widen<T, Isa>::lo16(S::load4(p)));
+  }
+  template <typename T>
+  static void exactProducts(const T* p1, const T* p2, __m128 out[1]) {
+    using W = Widen<T, Isa>;
+    out[0] = W::lo(_mm_mullo_epi16(W::lo16(S::load4(p1)), W::lo16(S::load4(p2))));
+  }
+  static void keepLanes(const uint8_t* mask, __m128 keep[1]) {
+    keep[0] = S::keepLow(_mm_cmpeq_epi8(S::load4(mask), _mm_setzero_si128()));
+  }
+  static __m128 select(__m128 keep, __m128 old, __m128 updated) { return S::select(keep, old, updated); }
+};
 
-// The formulas: a is the accumulator, s1 and s2 the converted sources.
-// kProduct: the formula is a + s1 x s2 (s2 = s1 for a square), so an exact
-// product may be passed to the plain sum instead.
+// The full-width helpers: a block is kVectors vectors of V. The baseline's
+// are here; the AVX2 ones in accumulate_avx2.h.
+template <typename Isa> struct Kit;
+
+template <> struct Kit<simd::Sse2> {
+  using Isa = simd::Sse2;
+  using V = simd::Vec<float>;
+  using S = Sse<Isa>;
+  static constexpr int kVectors = 4;
+
+  // Sixteen 16-bit lanes (two vectors) as four float vectors.
+  template <typename T>
+  static void toFloats(__m128i low, __m128i high, __m128 out[4]) {
+    out[0] = Widen<T, Isa>::lo(low);
+    out[1] = Widen<T, Isa>::hi(low);
+    out[2] = Widen<T, Isa>::lo(high);
+    out[3] = Widen<T, Isa>::hi(high);
+  }
+  template <typename T>
+  static void toFloat(const T* p, __m128 out[4]) {
+    if constexpr (std::is_same<T, float>::value) {
+      for (int i = 0; i < 4; ++i) out[i] = _mm_loadu_ps(p + 4 * i);
+    } else if constexpr (sizeof(T) == 2) {
+      toFloats<T>(S::loadu(p), S::loadu(p + 8), out);
+    } else {
+      __m128i v = S::loadu(p);
+      toFloats<T>(Widen<T, Isa>::lo16(v), Widen<T, Isa>::hi16(v), out);
+    }
+  }
+  template <typename T>
+  static void exactProducts(const T* p1, const T* p2, __m128 out[4]) {
+    using W = Widen<T, Isa>;
+    __m128i a = S::loadu(p1), b = S::loadu(p2);
+    toFloats<T>(_mm_mullo_epi16(W::lo16(a), W::lo16(b)), _mm_mullo_epi16(W::hi16(a), W::hi16(b)), out);
+  }
+  static void keepLanes(const uint8_t* mask, __m128 keep[4]) {
+    __m128i zero = _mm_cmpeq_epi8(S::loadu(mask), _mm_setzero_si128());
+    __m128i l = _mm_unpacklo_epi8(zero, zero), h = _mm_unpackhi_epi8(zero, zero);
+    keep[0] = _mm_castsi128_ps(_mm_unpacklo_epi16(l, l));
+    keep[1] = _mm_castsi128_ps(_mm_unpackhi_epi16(l, l));
+    keep[2] = _mm_castsi128_ps(_mm_unpacklo_epi16(h, h));
+    keep[3] = _mm_castsi128_ps(_mm_unpackhi_epi16(h, h));
+  }
+  static __m128 select(__m128 keep, __m128 old, __m128 updated) { return S::select(keep, old, updated); }
+};
+
+// ---- The formulas -------------------------------------------------------------
+
+// a is the accumulator, s1 and s2 the converted sources (s2 = s1 with one
+// source). kProduct: the formula is a + s1 x s2, so an exact product may be
+// passed to the plain sum instead.
 struct Add {
   static constexpr bool kProduct = false;
-  float operator()(float a, float s, float) const { return a + s; }
-  __m128 operator()(__m128 a, __m128 s, __m128) const { return _mm_add_ps(a, s); }
-};
-struct AddSquare {
-  static constexpr bool kProduct = true;
-  float operator()(float a, float s, float) const { return a + s * s; }
-  __m128 operator()(__m128 a, __m128 s, __m128) const { return _mm_add_ps(a, _mm_mul_ps(s, s)); }
+  template <typename V>
+  typename V::Raw apply(typename V::Raw a, typename V::Raw s, typename V::Raw) const {
+    return V::add(a, s);
+  }
 };
 struct AddProduct {
   static constexpr bool kProduct = true;
-  float operator()(float a, float s1, float s2) const { return a + s1 * s2; }
-  __m128 operator()(__m128 a, __m128 s1, __m128 s2) const { return _mm_add_ps(a, _mm_mul_ps(s1, s2)); }
+  template <typename V>
+  typename V::Raw apply(typename V::Raw a, typename V::Raw s1, typename V::Raw s2) const {
+    return V::add(a, V::mul(s1, s2));
+  }
 };
+// The square is the product of the source with itself.
+struct AddSquare : AddProduct {};
 // The running average as one subtraction, one product and one sum.
 struct AddWeighted {
   static constexpr bool kProduct = false;
   float alpha;
-  float operator()(float a, float s, float) const { return (s - a) * alpha + a; }
-  __m128 operator()(__m128 a, __m128 s, __m128) const {
-    return _mm_add_ps(_mm_mul_ps(_mm_sub_ps(s, a), _mm_set1_ps(alpha)), a);
+  template <typename V>
+  typename V::Raw apply(typename V::Raw a, typename V::Raw s, typename V::Raw) const {
+    return V::add(V::mul(V::sub(s, a), V::set1(alpha)), a);
   }
 };
 
+// ---- Rows ---------------------------------------------------------------------
+
 // One row of an update. With kInPlace the accumulator read is the one
 // written (so its vector loads are aligned); otherwise it is a separate image.
-template <typename Src, int kSources, bool kMasked, bool kInPlace, typename Formula>
+template <typename Src, int kSources, bool kMasked, bool kInPlace, typename Formula, typename Isa>
 class Row {
+  using Block = Kit<Isa>;
+  using Part = Quad<Isa>;
+
  public:
-  static constexpr int kBlock = 16;
+  static constexpr int kBlock = Block::kVectors * Block::V::kLanes;
   static constexpr int kPart = 4;
+  static constexpr int kBlockAlign = Isa::kBytes;
 
   Row(const Src* src1, const Src* src2, const uint8_t* mask, const float* acc, float* out, const Formula& f)
       : src1_(src1), src2_(src2), mask_(mask), acc_(acc), out_(out), f_(f) {}
@@ -156,29 +208,29 @@ class Row {
 
   void one(int x) {
     if (kMasked && !mask_[x]) return;
-    float s2 = kSources == 2 ? float(src2_[x]) : 0.0f;
-    out_[x] = f_(acc_[x], float(src1_[x]), s2);
+    float s1 = float(src1_[x]);
+    out_[x] = f_.template apply<Scalar<Isa>>(acc_[x], s1, kSources == 2 ? float(src2_[x]) : s1);
   }
 
   // Masked blocks always select lane by lane: a branch on all-zero or
   // all-set masks costs more in mispredictions at region edges than it saves.
   template <StoreMode M>
   void block(int x) {
-    __m128 keep[4] = {};
-    if (kMasked) keepLanes(_mm_cmpeq_epi8(loadu(mask_ + x), _mm_setzero_si128()), keep);
-    update<M, kMasked>(x, keep);
+    if (kSources == 2 || kMasked) {
+      // With three or four streams to read, the hardware prefetchers alone
+      // leave the memory idle between requests: ask ahead, every line of
+      // each stream that a block spans (no fault past the end).
+      prefetch(acc_ + x);
+      prefetch(src1_ + x);
+      if (kSources == 2) prefetch(src2_ + x);
+      if (kMasked) prefetch(mask_ + x);
+    }
+    update<Block, M>(x);
   }
 
   template <StoreMode M>
   void part(int x) {
-    __m128 s1, s2;
-    if constexpr (kExactProduct) {
-      s1 = s2 = exactProducts(src1_ + x, second() + x);
-    } else {
-      s1 = ToFloat<Src>::part(src1_ + x);
-      s2 = kSources == 2 ? ToFloat<Src>::part(src2_ + x) : s1;
-    }
-    store<M, kMasked>(x, s1, s2, kMasked ? keepLanes(mask_ + x) : s1);
+    update<Part, M>(x);
   }
 
  private:
@@ -187,38 +239,39 @@ class Row {
   static constexpr bool kExactProduct =
       Formula::kProduct && sizeof(Src) == 1 && (std::is_unsigned<Src>::value || kSources == 1);
 
-  template <StoreMode M, bool kSelect>
-  void update(int x, const __m128 keep[4]) {
-    if (kSources == 2 || kMasked) {
-      // With three or four streams to read, the hardware prefetchers alone
-      // leave the memory idle between requests: ask ahead (no fault past the end).
-      prefetch(acc_ + x + kPrefetchAhead);
-      prefetch(src1_ + x + kPrefetchAhead);
-      if (kSources == 2) prefetch(src2_ + x + kPrefetchAhead);
-      if (kMasked) prefetch(mask_ + x + kPrefetchAhead);
-    }
-    __m128 s1[4], s2[4];
-    if constexpr (kExactProduct) {
-      exactProducts(src1_ + x, second() + x, s1);
-    } else {
-      ToFloat<Src>::block(src1_ + x, s1);
-      if (kSources == 2) ToFloat<Src>::block(src2_ + x, s2);
-    }
-    for (int i = 0; i < 4; ++i)
-      store<M, kSelect>(x + 4 * i, s1[i], kSources == 2 && !kExactProduct ? s2[i] : s1[i], keep[i]);
-  }
-
   static constexpr int kPrefetchAhead = 256;  // pixels
-  static void prefetch(const void* p) { _mm_prefetch(static_cast<const char*>(p), _MM_HINT_T0); }
+  template <typename T>
+  static void prefetch(const T* p) {
+    for (int i = 0; i < kBlock; i += 64 / int(sizeof(T)))
+      _mm_prefetch(reinterpret_cast<const char*>(p + kPrefetchAhead + i), _MM_HINT_T0);
+  }
 
   const Src* second() const { return kSources == 2 ? src2_ : src1_; }
 
-  template <StoreMode M, bool kSelect>
-  void store(int x, __m128 s1, __m128 s2, __m128 keep) {
-    __m128 a = kInPlace ? _mm_load_ps(acc_ + x) : _mm_loadu_ps(acc_ + x);
-    __m128 r = kExactProduct ? _mm_add_ps(a, s1) : f_(a, s1, s2);
-    if (kSelect) r = select(keep, a, r);
-    simd::put<M, simd::Vec<float>>(out_ + x, r);
+  // Kit::kVectors vectors from pixel x on.
+  template <typename K, StoreMode M>
+  void update(int x) {
+    using V = typename K::V;
+    constexpr int n = K::kVectors;
+    typename V::Raw s1[n], s2[n], keep[n];
+    if constexpr (kExactProduct) {
+      K::exactProducts(src1_ + x, second() + x, s1);
+    } else {
+      K::toFloat(src1_ + x, s1);
+      if (kSources == 2) K::toFloat(src2_ + x, s2);
+    }
+    if constexpr (kMasked) K::keepLanes(mask_ + x, keep);
+    for (int i = 0; i < n; ++i) {
+      const int at = x + i * V::kLanes;
+      typename V::Raw a = kInPlace ? V::load(acc_ + at) : V::loadu(acc_ + at);
+      typename V::Raw r;
+      if constexpr (kExactProduct)
+        r = V::add(a, s1[i]);
+      else
+        r = f_.template apply<V>(a, s1[i], kSources == 2 ? s2[i] : s1[i]);
+      if constexpr (kMasked) r = K::select(keep[i], a, r);
+      simd::put<M, V>(out_ + at, r);
+    }
   }
 
   const Src* src1_;
@@ -239,14 +292,38 @@ struct Images {
   Plane<float> out;
 };
 
-template <int kSources, bool kMasked, bool kInPlace, typename Src, typename Formula>
+template <int kSources, bool kMasked, bool kInPlace, typename Src, typename Formula, typename Isa>
 void run(StoreMode mode, const Images<Src>& im, int width, int height, Formula f) {
   driveRows(mode, width, height, [&](int y) {
-    return Row<Src, kSources, kMasked, kInPlace, Formula>(
+    return Row<Src, kSources, kMasked, kInPlace, Formula, Isa>(
         im.src1.row(y), kSources == 2 ? im.src2.row(y) : nullptr, kMasked ? im.mask.row(y) : nullptr,
         im.acc.row(y), im.out.row(y), f);
   });
 }
+
+// Every instance that the exports run, as
+// X(kSources, kMasked, kInPlace, Src, Formula).
+#define ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, kSources, kMasked, Formula) \
+  X(kSources, kMasked, true, uint8_t, Formula)                          \
+  X(kSources, kMasked, true, int8_t, Formula)                           \
+  X(kSources, kMasked, true, uint16_t, Formula)                         \
+  X(kSources, kMasked, true, float, Formula)
+#define ZELCV_ACCUMULATE_INSTANCES(X)                             \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, false, Add)             \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, true, Add)              \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, false, AddSquare)       \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, true, AddSquare)        \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 2, false, AddProduct)      \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 2, true, AddProduct)       \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, false, AddWeighted)     \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, true, AddWeighted)      \
+  X(1, false, false, float, AddWeighted)
+
+#define ZELCV_ACCUMULATE_RUN(kSources, kMasked, kInPlace, Src, Formula) \
+  void run<kSources, kMasked, kInPlace, Src, Formula, avx2::Isa>(StoreMode, const Images<Src>&, int, int, Formula);
+#define ZELCV_ACCUMULATE_EXTERN(...) extern template ZELCV_ACCUMULATE_RUN(__VA_ARGS__)
+// Built in accumulate_avx2.cpp.
+ZELCV_ACCUMULATE_INSTANCES(ZELCV_ACCUMULATE_EXTERN)
 
 }  // namespace accumulate
 }  // namespace zelcv

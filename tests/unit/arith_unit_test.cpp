@@ -41,18 +41,21 @@ TEST(StoreMode, BytesTouchedAreCountedIn64Bits) {
   EXPECT_EQ(zelcv::storeModeFor(int64_t(INT_MAX) - 1, INT_MAX), StoreMode::Ordinary);
 }
 
-// A row that records what the driver asked of it.
+// A row that records what the driver asked of it. kAlign is the alignment its
+// blocks need (a wider instruction set's); parts are always 16 bytes.
 struct Visits {
   std::vector<int> count;  // per pixel
   int singles = 0, blocks = 0, parts = 0;
+  int partsBeforeBlocks = 0, partsAfterBlocks = 0;
   int firstVector = -1, nextVector = -1;  // vector steps must be contiguous
-  int misalignedVectors = 0, gaps = 0, streamed = 0;
+  int misalignedVectors = 0, misalignedBlocks = 0, gaps = 0, streamed = 0;
 };
 
-template <typename T>
+template <typename T, int kAlign>
 struct RecordingRow {
   static constexpr int kPart = 16 / int(sizeof(T));
-  static constexpr int kBlock = 4 * kPart;
+  static constexpr int kBlock = kAlign / 16 * 4 * kPart;
+  static constexpr int kBlockAlign = kAlign;
   const T* row;
   Visits* v;
 
@@ -64,11 +67,13 @@ struct RecordingRow {
   template <StoreMode M>
   void block(int x) {
     ++v->blocks;
+    if (reinterpret_cast<uintptr_t>(row + x) % kAlign != 0) ++v->misalignedBlocks;
     vector<M>(x, kBlock);
   }
   template <StoreMode M>
   void part(int x) {
     ++v->parts;
+    ++(v->blocks ? v->partsAfterBlocks : v->partsBeforeBlocks);
     vector<M>(x, kPart);
   }
   template <StoreMode M>
@@ -83,37 +88,52 @@ struct RecordingRow {
 };
 
 // Every pixel exactly once; single pixels up to the first 16-byte boundary,
-// then contiguous aligned vectors (whole blocks, then fewer than a block's
-// worth of parts), then fewer than a part's worth of single pixels.
-template <typename T>
+// then contiguous aligned vectors (parts until the block alignment, whole
+// blocks, then fewer than a block's worth of parts), then fewer than a part's
+// worth of single pixels.
+template <typename T, int kAlign>
 void checkDriver(StoreMode mode) {
-  using Row = RecordingRow<T>;
-  alignas(16) static T buffer[128];
-  for (int offset = 0; offset < 16 / int(sizeof(T)); ++offset)
-    for (int width = 1; width <= 100; ++width) {
+  using Row = RecordingRow<T, kAlign>;
+  alignas(64) static T buffer[400];
+  for (int offset = 0; offset < 64 / int(sizeof(T)); ++offset)
+    for (int width = 1; width <= 300; width += width < 140 ? 1 : 7) {
       SCOPED_TRACE(::testing::Message() << "offset " << offset << ", width " << width);
       Visits v;
       v.count.assign(width, 0);
       zelcv::driveRows(mode, width, 1, [&](int) { return Row{buffer + offset, &v}; });
       for (int c : v.count) ASSERT_EQ(c, 1);
-      const int toBoundary = (16 - offset * int(sizeof(T))) % 16 / int(sizeof(T));
+      const int toBoundary = (16 - offset * int(sizeof(T)) % 16) % 16 / int(sizeof(T));
       const int head = toBoundary < width ? toBoundary : width;
       const int vectorPixels = (width - head) / Row::kPart * Row::kPart;
-      EXPECT_EQ(v.blocks, vectorPixels / Row::kBlock);
-      EXPECT_EQ(v.parts, vectorPixels % Row::kBlock / Row::kPart);
+      EXPECT_EQ(v.blocks * Row::kBlock + v.parts * Row::kPart, vectorPixels);
+      if (v.blocks) {
+        EXPECT_LT(v.partsBeforeBlocks, kAlign / 16);
+        EXPECT_LT(v.partsAfterBlocks, Row::kBlock / Row::kPart);
+      } else {
+        // No block fitted after the lead parts.
+        EXPECT_LT(vectorPixels, Row::kBlock + (kAlign / 16 - 1) * Row::kPart);
+      }
       EXPECT_EQ(v.singles, width - vectorPixels);
       EXPECT_EQ(v.firstVector, vectorPixels ? head : -1);
       EXPECT_EQ(v.misalignedVectors, 0);
+      EXPECT_EQ(v.misalignedBlocks, 0);
       EXPECT_EQ(v.gaps, 0);
       EXPECT_EQ(v.streamed, mode == StoreMode::Streaming ? v.blocks + v.parts : 0);
     }
 }
 
 TEST(RowDriver, VisitsEveryPixelOnceWithAlignedVectors) {
-  checkDriver<float>(StoreMode::Ordinary);
-  checkDriver<float>(StoreMode::Streaming);
-  checkDriver<uint16_t>(StoreMode::Ordinary);
-  checkDriver<uint8_t>(StoreMode::Streaming);
+  checkDriver<float, 16>(StoreMode::Ordinary);
+  checkDriver<float, 16>(StoreMode::Streaming);
+  checkDriver<uint16_t, 16>(StoreMode::Ordinary);
+  checkDriver<uint8_t, 16>(StoreMode::Streaming);
+}
+
+TEST(RowDriver, WideBlocksStartAtTheirAlignment) {
+  checkDriver<float, 32>(StoreMode::Ordinary);
+  checkDriver<float, 32>(StoreMode::Streaming);
+  checkDriver<uint16_t, 32>(StoreMode::Streaming);
+  checkDriver<uint8_t, 32>(StoreMode::Ordinary);
 }
 
 }  // namespace
