@@ -7,10 +7,14 @@
 
 #include <stdint.h>
 
+#include "kernels/simd.h"
 #include "morph/morph_state.h"
 #include "zelcv.h"
 
 namespace zelcv {
+namespace avx2 {
+struct Isa;
+}
 namespace morph {
 
 // Maximum (or minimum) over a solid rw x rh rectangle whose top-left element
@@ -26,6 +30,21 @@ void rectFilter(bool max, const T* src, int srcStep, T* dst, int dstStep, ZeliSi
 template <typename T>
 void apply(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels,
            ZeliBorderType border, const View& state, uint8_t* work);
+
+// The cores of one instruction set (simd::Sse2 or avx2::Isa), behind the two
+// entries above; both sets give the same results bit for bit.
+template <typename T, typename Isa>
+struct Cores {
+  static void rect(bool max, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels, int rw,
+                   int rh, int ox, int oy, uint8_t* work);
+  static void apply(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels,
+                    ZeliBorderType border, const View& state, uint8_t* work);
+};
+// Built in morph_core_avx2.cpp.
+extern template struct Cores<uint8_t, avx2::Isa>;
+extern template struct Cores<uint16_t, avx2::Isa>;
+extern template struct Cores<int16_t, avx2::Isa>;
+extern template struct Cores<float, avx2::Isa>;
 
 // The same on 1-bit images (src != dst).
 void applyBits(bool dilate, const uint8_t* src, int srcStep, int srcBitOffset, uint8_t* dst, int dstStep,
