@@ -26,17 +26,18 @@ void rectFilter(bool max, const T* src, int srcStep, T* dst, int dstStep, ZeliSi
 
 template <typename T>
 void apply(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels,
-           ZeliBorderType border, const View& state, uint8_t* work) {
+           ZeliBorderType border, const View& state, uint8_t* work, const RowSink& sink) {
   if (useAvx2Kernels())
-    Cores<T, avx2::Isa>::apply(dilate, src, srcStep, dst, dstStep, roi, channels, border, state, work);
+    Cores<T, avx2::Isa>::apply(dilate, src, srcStep, dst, dstStep, roi, channels, border, state, work, sink);
   else
-    Cores<T, simd::Sse2>::apply(dilate, src, srcStep, dst, dstStep, roi, channels, border, state, work);
+    Cores<T, simd::Sse2>::apply(dilate, src, srcStep, dst, dstStep, roi, channels, border, state, work, sink);
 }
 
 #define ZELCV_MORPH_INSTANTIATE(T)                                                                  \
   template struct Cores<T, simd::Sse2>;                                                               \
   template void rectFilter<T>(bool, const T*, int, T*, int, ZeliSize, int, int, int, int, int, uint8_t*); \
-  template void apply<T>(bool, const T*, int, T*, int, ZeliSize, int, ZeliBorderType, const View&, uint8_t*);
+  template void apply<T>(bool, const T*, int, T*, int, ZeliSize, int, ZeliBorderType, const View&, uint8_t*, \
+                         const RowSink&);
 ZELCV_MORPH_INSTANTIATE(uint8_t)
 ZELCV_MORPH_INSTANTIATE(uint16_t)
 ZELCV_MORPH_INSTANTIATE(int16_t)

@@ -48,6 +48,12 @@ bool overlaps(const void* src, int srcStep, const void* dst, int dstStep, int he
   return s < dEnd && d < sEnd;
 }
 
+// Asks for the next source row while the current one is processed.
+void prefetchRow(const void* row, size_t bytes) {
+  const char* p = static_cast<const char*>(row);
+  for (size_t i = 0; i < bytes; i += 64) _mm_prefetch(p + i, _MM_HINT_T0);
+}
+
 // Vertical windows up to this height combine rows directly; taller ones use
 // the van Herk scheme.
 constexpr int kDirectHeights = 9;
@@ -71,7 +77,7 @@ Slots<T> makeSlots(uint8_t* work, int width, int channels) {
 // cost per pixel does not depend on the height.
 template <typename T, typename Op>
 void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, int rw, int rh, int ox,
-              int oy, uint8_t* work) {
+              int oy, uint8_t* work, const RowSink& sink) {
   int s = -ox, K = rw, sv = -oy, Kv = rh;
   clipWindow(s, K, W);
   clipWindow(sv, Kv, H);
@@ -83,9 +89,15 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
   const bool up = sv + Kv - 1 < 0;
   auto extRow = [&](int k) { return rowAt(src, srcStep, clampInt(up ? H + sv + Kv - 2 - k : sv + k, 0, H - 1)); };
   auto outRow = [&](int m) { return rowAt(dst, dstStep, up ? H - 1 - m : m); };
+  auto done = [&](int m, int count) {
+    for (int i = m; i < m + count; ++i) sink(up ? H - 1 - i : i);
+  };
   // Not in place, the last output row is free scratch until it is written.
   T* temp = inPlace ? nullptr : outRow(H - 1);
-  auto hpass = [&](int k, T* out) { minmax::windowRow<T, Op>(extRow(k), out, W, c, s, K, out == temp ? nullptr : temp); };
+  auto hpass = [&](int k, T* out) {
+    prefetchRow(extRow(k + 1), sizeof(T) * size_t(n));
+    minmax::windowRow<T, Op>(extRow(k), out, W, c, s, K, out == temp ? nullptr : temp);
+  };
   const int steps = H + Kv - 1;
 
   if (Kv == 1) {
@@ -96,6 +108,7 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
         hpass(m, slot[0]);
         memcpy(outRow(m), slot[0], sizeof(T) * size_t(n));
       }
+      done(m, 1);
     }
     return;
   }
@@ -116,17 +129,20 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
         const T* b[3] = {slot[(m + Kv) % ring], slot[(m + Kv + 1) % ring], slot[(m + Kv + 2) % ring]};
         for (int i = 0; i < Kv - 3; ++i) common[i] = slot[(m + 3 + i) % ring];
         minmax::CountTableTo<minmax::CombineQuad, T, Op, kDirectHeights>::kernel[Kv - 2](out, common, a, b, n);
+        done(m, 4);
         m += 4;
       } else if (m + 1 < H) {
         ensure(m + Kv);
         for (int i = 0; i < Kv - 1; ++i) common[i] = slot[(m + 1 + i) % ring];
         minmax::CountTableTo<minmax::CombinePair, T, Op, kDirectHeights>::kernel[Kv - 1](
             outRow(m), outRow(m + 1), common, slot[m % ring], slot[(m + Kv) % ring], n);
+        done(m, 2);
         m += 2;
       } else {
         ensure(m + Kv - 1);
         for (int i = 0; i < Kv; ++i) common[i] = slot[(m + i) % ring];
         minmax::combineRows<T, Op>(outRow(m), common, Kv, n);
+        done(m, 1);
         m += 1;
       }
     }
@@ -140,11 +156,13 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
     if (q == Kv - 1) {
       for (int i = Kv - 2; i >= 0; --i) minmax::combineForward<T, Op>(slot[hg + i], slot[hg + i], slot[hg + i + 1], n);
       memcpy(outRow(k - Kv + 1), slot[hg], sizeof(T) * size_t(n));
+      done(k - Kv + 1, 1);
     } else if (b > 0) {
       // The prefix of this block so far takes the slot of the previous
       // block's suffix row q, used by the step before (row 0 at the block end).
       minmax::vanHerkStep<T, Op>(outRow(k - Kv + 1), slot[sg + q], q ? slot[sg + q - 1] : nullptr, h,
                                  slot[sg + q + 1], n);
+      done(k - Kv + 1, 1);
     }
   }
 }
@@ -153,7 +171,7 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
 // output row, the maximum of the run rows that the element's rows select.
 template <typename T, typename Op>
 void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, const View& v,
-              uint8_t* work) {
+              uint8_t* work, const RowSink& sink) {
   const RowEntry* rows = v.rows;
   const int rowCount = v.shape.rowCount, runCount = v.shape.runCount;
   const int dyMin = rows[0].dy, dyMax = rows[rowCount - 1].dy, span = dyMax - dyMin + 1;
@@ -186,6 +204,7 @@ void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
   }
   for (int r = dyMin; r <= H - 1 + dyMax; ++r) {
     const int g = (r - dyMin) % span;
+    prefetchRow(srcRow(r + 1), sizeof(T) * size_t(n));
     auto runRow = [&](int j) -> const T* { return aliased(j) ? srcRow(r) : slot[g * runCount + j]; };
     for (int i = 0; i < runCount; ++i) {
       if (!planned) {
@@ -211,6 +230,7 @@ void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
       pointers[i] = aliased(j) ? srcRow(rr) : slot[((rr - dyMin) % span) * runCount + j];
     }
     minmax::combineRows<T, Op>(rowAt(dst, dstStep, y), pointers, rowCount, n);
+    sink(y);
   }
 }
 
@@ -220,7 +240,7 @@ void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
 // kept in a ring.
 template <typename T, typename Op>
 void generalCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, ZeliBorderType border,
-                 const View& v, uint8_t* work) {
+                 const View& v, uint8_t* work, const RowSink& sink) {
   const int mw = v.maskWidth, mh = v.maskHeight, ax = v.anchorX, ay = v.anchorY;
   const int n = W * c;
   const bool inPlace = overlaps(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(n));
@@ -255,6 +275,7 @@ void generalCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, i
         first = false;
       }
     }
+    sink(y);
   }
 }
 
@@ -263,7 +284,7 @@ void generalCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, i
 // whose elements reach past a replicated side are done element by element.
 template <typename T, typename Op>
 void pointsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int c, ZeliBorderType border,
-                const View& v) {
+                const View& v, const RowSink& sink) {
   const int mw = v.maskWidth, mh = v.maskHeight, ax = v.anchorX, ay = v.anchorY;
   const bool top = inMemoryTop(border), bottom = inMemoryBottom(border);
   const bool left = inMemoryLeft(border), right = inMemoryRight(border);
@@ -321,6 +342,7 @@ void pointsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, in
         out[x * c + ch] = best;
       }
     }
+    sink(y);
   }
 }
 
@@ -332,21 +354,22 @@ void copyRows(const T* src, int srcStep, T* dst, int dstStep, int H, size_t rowB
 
 template <typename T, typename Op>
 void applyWith(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int c, ZeliBorderType border,
-               const View& v, uint8_t* work) {
+               const View& v, uint8_t* work, const RowSink& sink) {
   const int W = roi.width, H = roi.height;
   if (borderKind(border) == zelBorderInMemory) border = zelBorderReplicate | 0xF0;
   const bool flags = (border & 0xF0) != 0;
-  if (v.kind == kEmpty)
+  if (v.kind == kEmpty) {
     copyRows(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(W) * c);
-  else if (v.kind == kRectangle && !flags)
+    for (int y = 0; y < H; ++y) sink(y);
+  } else if (v.kind == kRectangle && !flags)
     rectCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, v.shape.rectWidth, v.shape.rectHeight,
-                    v.shape.rectOffsetX, v.shape.rectOffsetY, work);
+                    v.shape.rectOffsetX, v.shape.rectOffsetY, work, sink);
   else if (v.kind == kRuns && !flags)
-    runsCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, v, work);
+    runsCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, v, work, sink);
   else if (overlaps(src, srcStep, dst, dstStep, H, sizeof(T) * size_t(W) * c))
-    generalCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, border, v, work);
+    generalCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, border, v, work, sink);
   else
-    pointsCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, border, v);
+    pointsCore<T, Op>(src, srcStep, dst, dstStep, W, H, c, border, v, sink);
 }
 
 }  // namespace
@@ -357,19 +380,19 @@ void Cores<T, Isa>::rect(bool max, const T* src, int srcStep, T* dst, int dstSte
                        int rw, int rh, int ox, int oy, uint8_t* work) {
   if (max)
     rectCore<T, minmax::MaxOp<T, Isa>>(src, srcStep, dst, dstStep, roi.width, roi.height, channels, rw, rh, ox,
-                                       oy, work);
+                                       oy, work, RowSink());
   else
     rectCore<T, minmax::MinOp<T, Isa>>(src, srcStep, dst, dstStep, roi.width, roi.height, channels, rw, rh, ox,
-                                       oy, work);
+                                       oy, work, RowSink());
 }
 
 template <typename T, typename Isa>
 void Cores<T, Isa>::apply(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels,
-                        ZeliBorderType border, const View& state, uint8_t* work) {
+                        ZeliBorderType border, const View& state, uint8_t* work, const RowSink& sink) {
   if (dilate)
-    applyWith<T, minmax::MaxOp<T, Isa>>(src, srcStep, dst, dstStep, roi, channels, border, state, work);
+    applyWith<T, minmax::MaxOp<T, Isa>>(src, srcStep, dst, dstStep, roi, channels, border, state, work, sink);
   else
-    applyWith<T, minmax::MinOp<T, Isa>>(src, srcStep, dst, dstStep, roi, channels, border, state, work);
+    applyWith<T, minmax::MinOp<T, Isa>>(src, srcStep, dst, dstStep, roi, channels, border, state, work, sink);
 }
 
 }  // namespace morph
