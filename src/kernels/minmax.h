@@ -2,8 +2,11 @@
 // families: element-wise combination of rows, horizontal window maxima (one
 // kernel per width 1..15, and a generic kernel that builds 4-, 16-, 64-...
 // pixel windows, so that its cost grows with the logarithm of the width),
-// and shifted combination with replicated or in-memory row ends. Elements of a multi-channel row are independent; a
-// window step is one pixel, that is `channels` elements.
+// and shifted combination with replicated or in-memory row ends. Elements of
+// a multi-channel row are independent; a window step is one pixel, that is
+// `channels` elements. The operation type names the instruction set (MaxOp<T>
+// is the baseline, MaxOp<T, avx2::Isa> the AVX2 form, built only in AVX2
+// files); both give the same results.
 #ifndef ZELCV_KERNELS_MINMAX_H
 #define ZELCV_KERNELS_MINMAX_H
 
@@ -258,13 +261,12 @@ template <typename T, typename Op>
 void combineBackward(T* out, const T* a, const T* b, int n) {
   // Whole vectors from the end down; the elements left over at the start go
   // last, one by one.
-  const int head = n - vectorLoop<T, Op>(n, [&](auto w, int j) {
+  const int vectors = vectorLoop<T, Op>(n, [&](auto w, int j) {
     using W = typename decltype(w)::type;
     const int i = n - j - W::kLanes;
     W::storeu(out + i, Op::template v<W>(W::loadu(a + i), W::loadu(b + i)));
   });
-  int i = head;
-  for (; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
+  for (int i = n - vectors; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
 }
 
 struct WindowOffsets {
