@@ -2,8 +2,11 @@
 // families: element-wise combination of rows, horizontal window maxima (one
 // kernel per width 1..15, and a generic kernel that builds 4-, 16-, 64-...
 // pixel windows, so that its cost grows with the logarithm of the width),
-// and shifted combination with replicated or in-memory row ends. Elements of a multi-channel row are independent; a
-// window step is one pixel, that is `channels` elements.
+// and shifted combination with replicated or in-memory row ends. Elements of
+// a multi-channel row are independent; a window step is one pixel, that is
+// `channels` elements. The operation type names the instruction set (MaxOp<T>
+// is the baseline, MaxOp<T, avx2::Isa> the AVX2 form, built only in AVX2
+// files); both give the same results.
 #ifndef ZELCV_KERNELS_MINMAX_H
 #define ZELCV_KERNELS_MINMAX_H
 
@@ -17,19 +20,42 @@ namespace zelcv {
 namespace minmax {
 
 // Scalar and vector operations agree on every ordered value: the scalar forms
-// repeat what the vector instructions do (first operand when it wins).
-template <typename T>
+// repeat what the vector instructions do (first operand when it wins). The
+// operation carries the instruction set of its kernels; `v` also serves the
+// 16-byte vectors that finish a row after the wide ones.
+template <typename T, typename Isa = simd::Sse2>
 struct MaxOp {
-  using V = simd::Vec<T>;
+  using V = simd::Vec<T, Isa>;
   static T s(T a, T b) { return a > b ? a : b; }
-  static typename V::Raw v(typename V::Raw a, typename V::Raw b) { return V::max(a, b); }
+  template <typename W = V>
+  static typename W::Raw v(typename W::Raw a, typename W::Raw b) { return W::max(a, b); }
 };
-template <typename T>
+template <typename T, typename Isa = simd::Sse2>
 struct MinOp {
-  using V = simd::Vec<T>;
+  using V = simd::Vec<T, Isa>;
   static T s(T a, T b) { return a < b ? a : b; }
-  static typename V::Raw v(typename V::Raw a, typename V::Raw b) { return V::min(a, b); }
+  template <typename W = V>
+  static typename W::Raw v(typename W::Raw a, typename W::Raw b) { return W::min(a, b); }
 };
+
+template <typename W>
+struct Width {
+  using type = W;
+};
+
+// Calls body(Width<W>(), i) over [0, n) in steps of whole vectors: the
+// operation's own width, then 16 bytes when that is wider; returns where the
+// single elements start. Bodies use `W` for every load, store and operation.
+template <typename T, typename Op, typename Body>
+inline int vectorLoop(int n, Body&& body) {
+  using V = typename Op::V;
+  using P = simd::Vec<T>;
+  int i = 0;
+  for (; i + V::kLanes <= n; i += V::kLanes) body(Width<V>(), i);
+  if (V::kLanes > P::kLanes)
+    for (; i + P::kLanes <= n; i += P::kLanes) body(Width<P>(), i);
+  return i;
+}
 
 // A kernel template instantiated for counts 1..N, indexed by the count;
 // `Which::get<N, T, Op>()` names the instance.
@@ -46,15 +72,14 @@ using CountTableTo = CountTable<Which, T, Op, std::make_integer_sequence<int, Mo
 // out[i] = op over rows[k][i], k < N, i < n.
 template <int N, typename T, typename Op>
 void combineRowsFixed(T* out, const T* const* rows, int n) {
-  using V = simd::Vec<T>;
   const T* r[N];
   for (int k = 0; k < N; ++k) r[k] = rows[k];
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) {
-    auto m = V::loadu(r[0] + i);
-    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(r[k] + i));
-    V::storeu(out + i, m);
-  }
+  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+    using W = typename decltype(w)::type;
+    auto m = W::loadu(r[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(r[k] + i));
+    W::storeu(out + i, m);
+  });
   for (; i < n; ++i) {
     T m = r[0][i];
     for (int k = 1; k < N; ++k) m = Op::s(m, r[k][i]);
@@ -89,14 +114,13 @@ void combineRows(T* out, const T* const* rows, int count, int n) {
 // N rows of `common`.
 template <int N, typename T, typename Op>
 void combinePair(T* out0, T* out1, const T* const* common, const T* first, const T* last, int n) {
-  using V = simd::Vec<T>;
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) {
-    auto m = V::loadu(common[0] + i);
-    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(common[k] + i));
-    V::storeu(out0 + i, Op::v(m, V::loadu(first + i)));
-    V::storeu(out1 + i, Op::v(m, V::loadu(last + i)));
-  }
+  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+    using W = typename decltype(w)::type;
+    auto m = W::loadu(common[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(common[k] + i));
+    W::storeu(out0 + i, Op::template v<W>(m, W::loadu(first + i)));
+    W::storeu(out1 + i, Op::template v<W>(m, W::loadu(last + i)));
+  });
   for (; i < n; ++i) {
     T m = common[0][i];
     for (int k = 1; k < N; ++k) m = Op::s(m, common[k][i]);
@@ -116,25 +140,25 @@ struct CombinePair {
 // out[2] = op(common, a2, b0, b1), out[3] = op(common, b0, b1, b2).
 template <int N, typename T, typename Op>
 void combineQuad(T* const* out, const T* const* common, const T* const* a, const T* const* b, int n) {
-  using V = simd::Vec<T>;
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) {
-    const auto a2 = V::loadu(a[2] + i), a1 = Op::v(V::loadu(a[1] + i), a2), a0 = Op::v(V::loadu(a[0] + i), a1);
-    const auto b0 = V::loadu(b[0] + i), b1 = Op::v(b0, V::loadu(b[1] + i)), b2 = Op::v(b1, V::loadu(b[2] + i));
+  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+    using W = typename decltype(w)::type;
+    auto f = [](typename W::Raw x, typename W::Raw y) { return Op::template v<W>(x, y); };
+    const auto a2 = W::loadu(a[2] + i), a1 = f(W::loadu(a[1] + i), a2), a0 = f(W::loadu(a[0] + i), a1);
+    const auto b0 = W::loadu(b[0] + i), b1 = f(b0, W::loadu(b[1] + i)), b2 = f(b1, W::loadu(b[2] + i));
     if constexpr (N == 0) {
-      V::storeu(out[0] + i, a0);
-      V::storeu(out[1] + i, Op::v(a1, b0));
-      V::storeu(out[2] + i, Op::v(a2, b1));
-      V::storeu(out[3] + i, b2);
+      W::storeu(out[0] + i, a0);
+      W::storeu(out[1] + i, f(a1, b0));
+      W::storeu(out[2] + i, f(a2, b1));
+      W::storeu(out[3] + i, b2);
     } else {
-      auto m = V::loadu(common[0] + i);
-      for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(common[k] + i));
-      V::storeu(out[0] + i, Op::v(m, a0));
-      V::storeu(out[1] + i, Op::v(m, Op::v(a1, b0)));
-      V::storeu(out[2] + i, Op::v(m, Op::v(a2, b1)));
-      V::storeu(out[3] + i, Op::v(m, b2));
+      auto m = W::loadu(common[0] + i);
+      for (int k = 1; k < N; ++k) m = f(m, W::loadu(common[k] + i));
+      W::storeu(out[0] + i, f(m, a0));
+      W::storeu(out[1] + i, f(m, f(a1, b0)));
+      W::storeu(out[2] + i, f(m, f(a2, b1)));
+      W::storeu(out[3] + i, f(m, b2));
     }
-  }
+  });
   for (; i < n; ++i) {
     const T a2 = a[2][i], a1 = Op::s(a[1][i], a2), a0 = Op::s(a[0][i], a1);
     const T b0 = b[0][i], b1 = Op::s(b0, b[1][i]), b2 = Op::s(b1, b[2][i]);
@@ -162,14 +186,13 @@ struct CombineQuad {
 // the maximum of the previous block's suffix and that prefix.
 template <typename T, typename Op>
 void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* suffix, int n) {
-  using V = simd::Vec<T>;
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) {
-    auto p = V::loadu(h + i);
-    if (prefixIn) p = Op::v(V::loadu(prefixIn + i), p);
-    V::storeu(prefixOut + i, p);
-    V::storeu(out + i, Op::v(V::loadu(suffix + i), p));
-  }
+  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+    using W = typename decltype(w)::type;
+    auto p = W::loadu(h + i);
+    if (prefixIn) p = Op::template v<W>(W::loadu(prefixIn + i), p);
+    W::storeu(prefixOut + i, p);
+    W::storeu(out + i, Op::template v<W>(W::loadu(suffix + i), p));
+  });
   for (; i < n; ++i) {
     T p = prefixIn ? Op::s(prefixIn[i], h[i]) : h[i];
     prefixOut[i] = p;
@@ -182,16 +205,17 @@ void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* s
 // `out` in that way only.
 template <typename T, typename Op>
 void combineForward(T* out, const T* a, const T* b, int n) {
-  using V = simd::Vec<T>;
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) V::storeu(out + i, Op::v(V::loadu(a + i), V::loadu(b + i)));
+  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+    using W = typename decltype(w)::type;
+    W::storeu(out + i, Op::template v<W>(W::loadu(a + i), W::loadu(b + i)));
+  });
   for (; i < n; ++i) out[i] = Op::s(a[i], b[i]);
 }
 
 // out[i] = op over src[i + offsets[k]], k < N, for i < n elements.
 template <int N, typename T, typename Op>
 void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
-  using V = simd::Vec<T>;
+  using V = typename Op::V;
   int o[N];
   for (int k = 0; k < N; ++k) o[k] = offsets[k];
   int i = 0;
@@ -207,11 +231,12 @@ void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
     V::storeu(out + i, m);
     V::storeu(out + i + V::kLanes, m2);
   }
-  for (; i + V::kLanes <= n; i += V::kLanes) {
-    auto m = V::loadu(src + i + o[0]);
-    for (int k = 1; k < N; ++k) m = Op::v(m, V::loadu(src + i + o[k]));
-    V::storeu(out + i, m);
-  }
+  i += vectorLoop<T, Op>(n - i, [&, i](auto w, int j) {
+    using W = typename decltype(w)::type;
+    auto m = W::loadu(src + i + j + o[0]);
+    for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(src + i + j + o[k]));
+    W::storeu(out + i + j, m);
+  });
   for (; i < n; ++i) {
     T m = src[i + o[0]];
     for (int k = 1; k < N; ++k) m = Op::s(m, src[i + o[k]]);
@@ -234,11 +259,14 @@ void windowFixed(const T* src, T* out, int n, int step) {
 // long as b - a <= shift.
 template <typename T, typename Op>
 void combineBackward(T* out, const T* a, const T* b, int n) {
-  using V = simd::Vec<T>;
-  int i = n;
-  for (; i >= V::kLanes; i -= V::kLanes)
-    V::storeu(out + i - V::kLanes, Op::v(V::loadu(a + i - V::kLanes), V::loadu(b + i - V::kLanes)));
-  for (; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
+  // Whole vectors from the end down; the elements left over at the start go
+  // last, one by one.
+  const int vectors = vectorLoop<T, Op>(n, [&](auto w, int j) {
+    using W = typename decltype(w)::type;
+    const int i = n - j - W::kLanes;
+    W::storeu(out + i, Op::template v<W>(W::loadu(a + i), W::loadu(b + i)));
+  });
+  for (int i = n - vectors; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
 }
 
 struct WindowOffsets {

@@ -9,48 +9,64 @@
 #include "kernels/simd.h"
 
 namespace zelcv {
+namespace avx2 {
+struct Isa;
+}
 namespace morphadv {
 
-template <typename T> struct Difference;
-
-template <> struct Difference<uint8_t> {
-  static uint8_t s(uint8_t a, uint8_t b) { return a > b ? uint8_t(a - b) : uint8_t(0); }
-  static __m128i v(__m128i a, __m128i b) { return _mm_subs_epu8(a, b); }
+// The scalar form and the vector form for any vector width `W`; `Isa` names
+// the instruction set the code is compiled for.
+template <typename T, typename Isa = simd::Sse2> struct Difference {
+  static T s(T a, T b) { return a > b ? T(a - b) : T(0); }
+  template <typename W>
+  static typename W::Raw v(typename W::Raw a, typename W::Raw b) { return W::subs(a, b); }
 };
-template <> struct Difference<uint16_t> {
-  static uint16_t s(uint16_t a, uint16_t b) { return a > b ? uint16_t(a - b) : uint16_t(0); }
-  static __m128i v(__m128i a, __m128i b) { return _mm_subs_epu16(a, b); }
-};
-template <> struct Difference<int16_t> {
+template <typename Isa> struct Difference<int16_t, Isa> {
   static int16_t s(int16_t a, int16_t b) {
     const int d = int(a) - int(b);
     return int16_t(d > 32767 ? 32767 : d < -32768 ? -32768 : d);
   }
-  static __m128i v(__m128i a, __m128i b) { return _mm_subs_epi16(a, b); }
+  template <typename W>
+  static typename W::Raw v(typename W::Raw a, typename W::Raw b) { return W::subs(a, b); }
 };
-// The clamp is written as `d > 0 ? d : 0` so that the scalar tail and
-// _mm_max_ps(d, 0) agree, NaN included (both give 0).
-template <> struct Difference<float> {
+// The clamp is written as `d > 0 ? d : 0` so that the scalar tail and the
+// vector max(d, 0) agree, NaN included (both give 0).
+template <typename Isa> struct Difference<float, Isa> {
   static float s(float a, float b) {
     const float d = a - b;
     return d > 0.0f ? d : 0.0f;
   }
-  static __m128 v(__m128 a, __m128 b) { return _mm_max_ps(_mm_sub_ps(a, b), _mm_setzero_ps()); }
+  template <typename W>
+  static typename W::Raw v(typename W::Raw a, typename W::Raw b) { return W::max(W::sub(a, b), W::set1(0.0f)); }
 };
+
+// One row of n elements with the vectors of `Isa`, then 16-byte vectors,
+// then single elements.
+template <typename T, typename Isa>
+void differenceRow(const T* a, const T* b, T* out, int n) {
+  using V = simd::Vec<T, Isa>;
+  using P = simd::Vec<T>;
+  int i = 0;
+  for (; i + 2 * V::kLanes <= n; i += 2 * V::kLanes) {
+    const auto d0 = Difference<T, Isa>::template v<V>(V::loadu(a + i), V::loadu(b + i));
+    const auto d1 = Difference<T, Isa>::template v<V>(V::loadu(a + i + V::kLanes), V::loadu(b + i + V::kLanes));
+    V::storeu(out + i, d0);
+    V::storeu(out + i + V::kLanes, d1);
+  }
+  for (; i + P::kLanes <= n; i += P::kLanes)
+    P::storeu(out + i, Difference<T, Isa>::template v<P>(P::loadu(a + i), P::loadu(b + i)));
+  for (; i < n; ++i) out[i] = Difference<T, Isa>::s(a[i], b[i]);
+}
+
+// Built in morph_core_avx2.cpp.
+extern template void differenceRow<uint8_t, avx2::Isa>(const uint8_t*, const uint8_t*, uint8_t*, int);
+extern template void differenceRow<uint16_t, avx2::Isa>(const uint16_t*, const uint16_t*, uint16_t*, int);
+extern template void differenceRow<int16_t, avx2::Isa>(const int16_t*, const int16_t*, int16_t*, int);
+extern template void differenceRow<float, avx2::Isa>(const float*, const float*, float*, int);
 
 template <typename T>
 inline void difference(const T* a, const T* b, T* out, int n) {
-  using V = simd::Vec<T>;
-  constexpr int L = V::kLanes;
-  int i = 0;
-  for (; i + 2 * L <= n; i += 2 * L) {
-    const auto d0 = Difference<T>::v(V::loadu(a + i), V::loadu(b + i));
-    const auto d1 = Difference<T>::v(V::loadu(a + i + L), V::loadu(b + i + L));
-    V::storeu(out + i, d0);
-    V::storeu(out + i + L, d1);
-  }
-  for (; i + L <= n; i += L) V::storeu(out + i, Difference<T>::v(V::loadu(a + i), V::loadu(b + i)));
-  for (; i < n; ++i) out[i] = Difference<T>::s(a[i], b[i]);
+  differenceRow<T, simd::Sse2>(a, b, out, n);
 }
 
 }  // namespace morphadv

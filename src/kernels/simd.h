@@ -58,6 +58,7 @@ template <> struct Vec<int16_t> : IntegerVec {
   static Raw set1(int16_t v) { return _mm_set1_epi16(v); }
   static Raw min(Raw a, Raw b) { return _mm_min_epi16(a, b); }
   static Raw max(Raw a, Raw b) { return _mm_max_epi16(a, b); }
+  static Raw subs(Raw a, Raw b) { return _mm_subs_epi16(a, b); }
 };
 
 template <> struct Vec<uint16_t> : IntegerVec {

@@ -60,6 +60,7 @@ template <> struct Vec<int16_t, avx2::Isa> : avx2::IntegerVec {
   static Raw set1(int16_t v) { return _mm256_set1_epi16(v); }
   static Raw min(Raw a, Raw b) { return _mm256_min_epi16(a, b); }
   static Raw max(Raw a, Raw b) { return _mm256_max_epi16(a, b); }
+  static Raw subs(Raw a, Raw b) { return _mm256_subs_epi16(a, b); }
 };
 
 template <> struct Vec<uint16_t, avx2::Isa> : avx2::IntegerVec {

@@ -8,6 +8,7 @@
 
 #include "core/alloc.h"
 #include "core/checks.h"
+#include "core/load.h"
 #include "core/status.h"
 #include "filter/border.h"
 #include "kernels/morphadv.h"
@@ -153,15 +154,18 @@ struct Typed {
   static int64_t rowBytes(int width) { return alignSize(int64_t(width) * C * int64_t(sizeof(T)), 32); }
   static View view(const void* state) { return readState(state); }
   static void pass(bool dilate, Plane s, Plane d, ZeliSize roi, ZeliBorderType border, const View& v,
-                   uint8_t* work, int64_t) {
+                   uint8_t* work, int64_t, const RowSink& sink) {
     apply<T>(dilate, reinterpret_cast<const T*>(s.base), s.step, reinterpret_cast<T*>(d.base), d.step, roi, C,
-             border, v, work);
+             border, v, work, sink);
   }
-  static void difference(Plane a, Plane b, Plane out, ZeliSize roi) {
-    for (int y = 0; y < roi.height; ++y)
-      morphadv::difference<T>(reinterpret_cast<const T*>(a.base + int64_t(y) * a.step),
-                              reinterpret_cast<const T*>(b.base + int64_t(y) * b.step),
-                              reinterpret_cast<T*>(out.base + int64_t(y) * out.step), roi.width * C);
+  static void difference(Plane a, Plane b, Plane out, int width, int y) {
+    const T* pa = reinterpret_cast<const T*>(a.base + int64_t(y) * a.step);
+    const T* pb = reinterpret_cast<const T*>(b.base + int64_t(y) * b.step);
+    T* po = reinterpret_cast<T*>(out.base + int64_t(y) * out.step);
+    if (useAvx2Kernels())
+      morphadv::differenceRow<T, avx2::Isa>(pa, pb, po, width * C);
+    else
+      morphadv::differenceRow<T, simd::Sse2>(pa, pb, po, width * C);
   }
 };
 
@@ -177,7 +181,7 @@ struct Bits {
   // extended width; when the working memory is short of that, the ROI is
   // done in column strips whose inner sides are read from memory.
   static void pass(bool dilate, Plane s, Plane d, ZeliSize roi, ZeliBorderType border, const View& v,
-                   uint8_t* work, int64_t workBytes) {
+                   uint8_t* work, int64_t workBytes, const RowSink& sink) {
     if (borderKind(border) == zelBorderInMemory) border = zelBorderReplicate | 0xF0;
     const int64_t slot = (workBytes - 31) / (v.maskHeight + 1) / 32 * 32;
     const int strip = int(std::max<int64_t>(1, std::min<int64_t>(roi.width, slot - (v.maskWidth - 1))));
@@ -189,20 +193,38 @@ struct Bits {
       applyBits(dilate, s.base, s.step, s.bitOffset + x0, d.base, d.step, d.bitOffset + x0, {w, roi.height},
                 ZeliBorderType(b), v, work);
     }
+    for (int y = 0; y < roi.height; ++y) sink(y);
   }
   static bool bit(const Plane& p, int x, int y) {
     const int i = p.bitOffset + x;
     return (p.base[int64_t(y) * p.step + (i >> 3)] >> (7 - (i & 7))) & 1;
   }
-  static void difference(Plane a, Plane b, Plane out, ZeliSize roi) {
-    for (int y = 0; y < roi.height; ++y)
-      for (int x = 0; x < roi.width; ++x) {
-        const bool on = bit(a, x, y) && !bit(b, x, y);
-        const int i = out.bitOffset + x;
-        uint8_t& byte = out.base[int64_t(y) * out.step + (i >> 3)];
-        const uint8_t mask = uint8_t(0x80 >> (i & 7));
-        byte = on ? uint8_t(byte | mask) : uint8_t(byte & ~mask);
-      }
+  static void difference(Plane a, Plane b, Plane out, int width, int y) {
+    for (int x = 0; x < width; ++x) {
+      const bool on = bit(a, x, y) && !bit(b, x, y);
+      const int i = out.bitOffset + x;
+      uint8_t& byte = out.base[int64_t(y) * out.step + (i >> 3)];
+      const uint8_t mask = uint8_t(0x80 >> (i & 7));
+      byte = on ? uint8_t(byte | mask) : uint8_t(byte & ~mask);
+    }
+  }
+};
+
+// out = a - b, row by row as the last pass finishes each row of its output
+// (the rows are then still in the cache).
+template <class F>
+struct DifferenceSink {
+  Plane a, b, out;
+  int width;
+  static void row(const void* self, int y) {
+    const DifferenceSink* d = static_cast<const DifferenceSink*>(self);
+    F::difference(d->a, d->b, d->out, d->width, y);
+  }
+  RowSink sink() const {
+    RowSink r;
+    r.fn = &row;
+    r.context = this;
+    return r;
   }
 };
 
@@ -212,7 +234,7 @@ struct Bits {
 // needs around the ROI already processed.
 template <class F>
 ZelStatus openClose(bool closing, Plane src, Plane dst, ZeliSize roi, ZeliBorderType border, const AdvHeader& h,
-                    uint8_t* buffer) {
+                    uint8_t* buffer, const RowSink& sink) {
   const View v1 = F::view(h.first), v2 = F::view(h.second);
   int flags = border & 0xF0;
   if (borderKind(border) == zelBorderInMemory) flags = 0xF0;
@@ -228,8 +250,8 @@ ZelStatus openClose(bool closing, Plane src, Plane dst, ZeliSize roi, ZeliBorder
   // working areas.
   const int64_t work = 2 * int64_t(h.workBytes);
   const Plane image = {buffer + work, int(step), 0};
-  F::pass(closing, F::shifted(src, -left, -top), image, wide, border, v1, buffer, work);
-  F::pass(!closing, F::shifted(image, left, top), dst, roi, border, v2, buffer, work);
+  F::pass(closing, F::shifted(src, -left, -top), image, wide, border, v1, buffer, work, RowSink());
+  F::pass(!closing, F::shifted(image, left, top), dst, roi, border, v2, buffer, work, sink);
   return zelStatusOk;
 }
 
@@ -242,15 +264,16 @@ ZelStatus compose(Op op, Plane src, Plane dst, ZeliSize roi, ZeliBorderType bord
     const View v = F::view(h.first);
     const Plane image = {static_cast<uint8_t*>(h.image), int(step), 0};
     const int64_t work = 2 * int64_t(h.workBytes);  // sequential passes: both areas each
-    F::pass(true, src, dst, roi, border, v, buffer, work);
-    F::pass(false, src, image, roi, border, v, buffer, work);
-    F::difference(dst, image, dst, roi);
+    const DifferenceSink<F> difference = {dst, image, dst, roi.width};
+    F::pass(true, src, dst, roi, border, v, buffer, work, RowSink());
+    F::pass(false, src, image, roi, border, v, buffer, work, difference.sink());
     return zelStatusOk;
   }
-  if (ZelStatus s = openClose<F>(op == kClose || op == kBlackhat, src, dst, roi, border, h, buffer)) return s;
-  if (op == kTophat) F::difference(src, dst, dst, roi);
-  if (op == kBlackhat) F::difference(dst, src, dst, roi);
-  return zelStatusOk;
+  DifferenceSink<F> difference = {src, dst, dst, roi.width};  // top-hat
+  if (op == kBlackhat) difference = {dst, src, dst, roi.width};
+  const bool plain = op == kOpen || op == kClose;
+  return openClose<F>(op == kClose || op == kBlackhat, src, dst, roi, border, h, buffer,
+                      plain ? RowSink() : difference.sink());
 }
 
 // Checks shared after the pointer, size and step checks: the border, the

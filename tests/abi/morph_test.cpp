@@ -40,9 +40,11 @@ Layout randomImageLayout(std::mt19937& rng, int width, int height, int channels)
 
 int randomIn(std::mt19937& rng, int lo, int hi) { return std::uniform_int_distribution<int>(lo, hi)(rng); }
 
-// Mostly small ROIs, now and then up to 64 x 48.
+// Mostly small ROIs, now and then up to 64 x 48, or rows wide enough for
+// several blocks of the widest vectors.
 ZeliSize randomRoi(std::mt19937& rng) {
   if (rng() % 3 == 0) return {randomIn(rng, 1, 6), randomIn(rng, 1, 6)};
+  if (rng() % 5 == 0) return {randomIn(rng, 65, 260), randomIn(rng, 1, 24)};
   return {randomIn(rng, 1, 64), randomIn(rng, 1, 48)};
 }
 
