@@ -26,7 +26,6 @@ template <> struct Wide<avx2::Isa> {
   static void storef(float* p, F a) { _mm256_storeu_ps(p, a); }
 
   static D setd(double a) { return _mm256_set1_pd(a); }
-  static D addd(D a, D b) { return _mm256_add_pd(a, b); }
   static D muld(D a, D b) { return _mm256_mul_pd(a, b); }
   // The product of two floats is exact in double, so the fused form rounds
   // once where the separate product and sum round once too: the same bits.

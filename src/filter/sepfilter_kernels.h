@@ -84,7 +84,6 @@ template <> struct Wide<simd::Sse2> {
   static void storef(float* p, F a) { _mm_storeu_ps(p, a); }
 
   static D setd(double a) { return _mm_set1_pd(a); }
-  static D addd(D a, D b) { return _mm_add_pd(a, b); }
   static D muld(D a, D b) { return _mm_mul_pd(a, b); }
   // acc + a x b where the product is exact in double (two floats widened).
   static D addExactProductd(D acc, D a, D b) { return _mm_add_pd(acc, _mm_mul_pd(a, b)); }
