@@ -7,10 +7,12 @@ namespace zelcv {
 namespace {
 int gCpuFeatureFlag = 0;
 bool gAvx2Kernels = false;
+bool gAvx512Kernels = false;
 constexpr uint32_t kFlagFeatures = zelCpuSSSE3 | zelCpuSSE41;
 // zelcore reports AVX, FMA and AVX2 only where the OS saves the wide
 // registers. Every processor with AVX2 so far also has FMA.
 constexpr uint32_t kAvx2Features = zelCpuAVX | zelCpuAVX2 | zelCpuFMA;
+constexpr uint32_t kAvx512Features = kAvx2Features | zelCpuAVX512F | zelCpuAVX512BW;
 }  // namespace
 
 int onLibraryLoad(void* /*module*/, uint32_t reason, void* /*reserved*/) {
@@ -18,6 +20,7 @@ int onLibraryLoad(void* /*module*/, uint32_t reason, void* /*reserved*/) {
     const uint32_t features = zelGetEnabledCpuFeatures();
     gCpuFeatureFlag = (features & kFlagFeatures) == kFlagFeatures ? 1 : 0;
     gAvx2Kernels = (features & kAvx2Features) == kAvx2Features;
+    gAvx512Kernels = (features & kAvx512Features) == kAvx512Features;
   }
   return 1;
 }
@@ -25,6 +28,8 @@ int onLibraryLoad(void* /*module*/, uint32_t reason, void* /*reserved*/) {
 int cpuFeatureFlag() { return gCpuFeatureFlag; }
 
 bool useAvx2Kernels() { return gAvx2Kernels; }
+
+bool useAvx512Kernels() { return gAvx512Kernels; }
 
 }  // namespace zelcv
 

@@ -25,6 +25,11 @@ int cpuFeatureFlag();
 // results bit for bit; before the load routine runs, the SSE2 kernels do.
 bool useAvx2Kernels();
 
+// Whether the few kernels that have AVX-512 forms run those: chosen at load,
+// when AVX2 kernels run and the processor and the operating system support
+// AVX-512 F and BW. The same results again.
+bool useAvx512Kernels();
+
 }  // namespace zelcv
 
 #endif  // ZELCV_CORE_LOAD_H

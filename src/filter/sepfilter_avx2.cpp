@@ -31,6 +31,18 @@ template <> struct Wide<avx2::Isa> {
   // once where the separate product and sum round once too: the same bits.
   static D addExactProductd(D acc, D a, D b) { return _mm256_fmadd_pd(a, b, acc); }
   static double firstd(D a) { return _mm256_cvtsd_f64(a); }
+  // Lanes r .. r + 3 of the concatenation lo:hi, from the middle two
+  // 128-bit halves and per-half picks.
+  template <int r> static D shiftd(D lo, D hi) {
+    static_assert(r >= 1 && r <= 3, "lane 0 is lo itself");
+    const D mid = _mm256_permute2f128_pd(lo, hi, 0x21);
+    if constexpr (r == 1)
+      return _mm256_shuffle_pd(lo, mid, 5);
+    else if constexpr (r == 2)
+      return mid;
+    else
+      return _mm256_shuffle_pd(mid, hi, 5);
+  }
   static D widen(const float* p) { return _mm256_cvtps_pd(_mm_loadu_ps(p)); }
   static void storeNarrowed(float* p, D a0, D a1) {
     _mm256_storeu_ps(p, _mm256_insertf128_ps(_mm256_castps128_ps256(_mm256_cvtpd_ps(a0)), _mm256_cvtpd_ps(a1), 1));

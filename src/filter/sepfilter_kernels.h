@@ -4,17 +4,21 @@
 // pointer (column pass). An arithmetic policy says how a sum is formed and
 // converted; the vector block and the scalar tail of each policy add the
 // same products in the same order (tap 0 first, no leading zero), so every
-// path, every alignment, both vector widths and both x86 targets give the
+// path, every alignment, every vector width and both x86 targets give the
 // same bits.
 //
 // The policies are written once over the instruction set: Wide<Isa> holds
-// the few vector operations they use, as 128-bit SSE2 here and as 256-bit
-// AVX2 in sepfilter_avx2.cpp, which alone builds the AVX2 instances.
+// the few vector operations they use, as 128-bit SSE2 here, as 256-bit AVX2
+// in sepfilter_avx2.cpp and, for the 32f policies, as 512-bit AVX-512 in
+// sepfilter_avx512.cpp; each of those files alone builds its instances.
 #ifndef ZELCV_FILTER_SEPFILTER_KERNELS_H
 #define ZELCV_FILTER_SEPFILTER_KERNELS_H
 
 #include <emmintrin.h>
 #include <stdint.h>
+
+#include <type_traits>
+#include <utility>
 
 #include "core/load.h"
 #include "kernels/simd.h"
@@ -23,9 +27,14 @@ namespace zelcv {
 namespace avx2 {
 struct Isa;
 }
+namespace avx512 {
+struct Isa;
+}
 namespace sep {
 
 // ---- sources -------------------------------------------------------------
+
+template <typename S, int N> struct FixedRowSource;
 
 // Row pass: tap k reads the row `stride` elements (one pixel) further on.
 template <typename S>
@@ -33,8 +42,13 @@ struct RowSource {
   const S* base;
   int stride;
   const S* at(int k) const { return base + k * stride; }
-  template <int N> RowSource fixed() const { return *this; }
+  template <int N> FixedRowSource<S, N> fixed() const { return {{base, stride}}; }
 };
+
+// The same with N taps known at compile time, for policies that cut the
+// windows of all taps from one pass over the row.
+template <typename S, int N>
+struct FixedRowSource : RowSource<S> {};
 
 // Column pass with a kernel size known at compile time: the row pointers
 // copied into locals, so that stores to the output cannot make the
@@ -88,6 +102,11 @@ template <> struct Wide<simd::Sse2> {
   // acc + a x b where the product is exact in double (two floats widened).
   static D addExactProductd(D acc, D a, D b) { return _mm_add_pd(acc, _mm_mul_pd(a, b)); }
   static double firstd(D a) { return _mm_cvtsd_f64(a); }
+  // Lanes r .. r + 1 of the concatenation lo:hi.
+  template <int r> static D shiftd(D lo, D hi) {
+    static_assert(r == 1, "lane 0 is lo itself");
+    return _mm_shuffle_pd(lo, hi, 1);
+  }
   // kFloats / 2 floats widened to doubles (an 8-byte load, one cvtps2pd).
   static D widen(const float* p) {
     return _mm_cvtps_pd(_mm_castsi128_ps(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p))));
@@ -299,6 +318,7 @@ template <class W> struct Lanes<double, W> {
   using Prepared = __m128d;
   static constexpr int kCount = W::kFloats / 2;
   static V load(const float* p) { return W::widen(p); }
+  template <int r> static V shift(V lo, V hi) { return W::template shiftd<r>(lo, hi); }
   static V mul(V a, V b) { return W::muld(a, b); }
   // acc + a x b for a float tap and a float pixel widened to double.
   static V addProduct(V acc, V a, V b) { return W::addExactProductd(acc, a, b); }
@@ -365,11 +385,59 @@ struct FloatDataSum {
     L::store(out + 2 * L::kCount, a2, a3);
   }
 
+  // Rows of one or three channels with a size known at compile time: each
+  // element is widened once and the window of every tap is cut from two
+  // neighbouring widened vectors; widening every tap's window anew would
+  // cost N conversions per vector, the bound of the row pass. The sums are
+  // those of the block above, term for term.
+  template <int N, class Taps>
+  static void block(const FixedRowSource<float, N>& src, int i, float* out, const Taps& taps, int n) {
+    if constexpr (std::is_same<Acc, double>::value) {
+      if (src.stride == 1) return slidingBlock<N, 1>(src.base + i, out, taps);
+      if (src.stride == 3) return slidingBlock<N, 3>(src.base + i, out, taps);
+    }
+    block(static_cast<const RowSource<float>&>(src), i, out, taps, n);
+  }
+
   template <class Src, class Taps>
   static float one(const Src& src, int i, const Taps& t, int n) {
     Acc acc = t.scalar(0) * static_cast<Acc>(src.at(0)[i]);
     for (int k = 1; k < n; ++k) acc += t.scalar(k) * static_cast<Acc>(src.at(k)[i]);
     return static_cast<float>(acc);
+  }
+
+ private:
+  // The window of tap K for output vector J: elements o .. o + kCount - 1
+  // with o = J kCount + K S, where c[m] holds elements m kCount on.
+  template <int S, int J, int K>
+  static V window(const V* c) {
+    constexpr int o = J * L::kCount + K * S, m = o / L::kCount, r = o % L::kCount;
+    if constexpr (r == 0)
+      return c[m];
+    else
+      return L::template shift<r>(c[m], c[m + 1]);
+  }
+  template <int S, int J, class Taps, int... K>
+  static V slidingSum(const V* c, const Taps& taps, std::integer_sequence<int, 0, K...>) {
+    V a = L::mul(taps.vec(0), window<S, J, 0>(c));
+    ((a = L::addProduct(a, taps.vec(K), window<S, J, K>(c))), ...);
+    return a;
+  }
+  template <int N, int S, class Taps, int... M>
+  static void slidingBlock(const float* p, float* out, const Taps& taps, std::integer_sequence<int, M...>) {
+    const V c[] = {L::load(p + M * L::kCount)...};
+    using TapIndices = std::make_integer_sequence<int, N>;
+    L::store(out, slidingSum<S, 0>(c, taps, TapIndices{}), slidingSum<S, 1>(c, taps, TapIndices{}));
+    L::store(out + 2 * L::kCount, slidingSum<S, 2>(c, taps, TapIndices{}), slidingSum<S, 3>(c, taps, TapIndices{}));
+  }
+  template <int N, int S, class Taps>
+  static void slidingBlock(const float* p, float* out, const Taps& taps) {
+    // The source rows come from memory once each, and the sums leave the
+    // loads too little time to overlap on their own: ask 2 KiB ahead.
+    for (int b = 0; b < 4 * L::kCount; b += 16) _mm_prefetch(reinterpret_cast<const char*>(p + 512 + b), _MM_HINT_T0);
+    // Four output vectors need the elements up to 3 kCount + (N - 1) S.
+    constexpr int kWidened = 4 + ((N - 1) * S + L::kCount - 1) / L::kCount;
+    slidingBlock<N, S>(p, out, taps, std::make_integer_sequence<int, kWidened>{});
   }
 };
 using DoubleSum = FloatDataSum<double>;
@@ -671,15 +739,27 @@ using ColPairs16s8u = PairSum<int16_t, uint8_t, true>;
   X(Isa, LowSum<>, ColumnSource<int16_t>, ComputedTaps<int16_t>)     \
   X(Isa, SingleSum, ColumnSource<float>, ComputedTaps<float>)
 
+// The 32f policies also have AVX-512 forms: their row pass sums in double,
+// and twice the lanes per instruction is what brings it up to speed.
+#define ZELCV_SEP_WIDEST_SPANS(X, Isa)                        \
+  X(Isa, DoubleSum, RowSource<float>, PreparedTaps<double>) \
+  X(Isa, SingleSum, ColumnSource<float>, ComputedTaps<float>)
+template <class P> struct HasAvx512Form : std::false_type {};
+template <typename Acc> struct HasAvx512Form<FloatDataSum<Acc>> : std::true_type {};
+
 #define ZELCV_SEP_SPAN(Isa, P, Src, Taps) \
   void spanWith<Isa, P, Src, Taps>(const P&, const Src&, P::Out*, int, const Taps&, int);
 #define ZELCV_SEP_EXTERN_SPAN(Isa, P, Src, Taps) extern template ZELCV_SEP_SPAN(Isa, P, Src, Taps)
-// Built in sepfilter_avx2.cpp.
+// Built in sepfilter_avx2.cpp and sepfilter_avx512.cpp.
 ZELCV_SEP_SPANS(ZELCV_SEP_EXTERN_SPAN, avx2::Isa)
+ZELCV_SEP_WIDEST_SPANS(ZELCV_SEP_EXTERN_SPAN, avx512::Isa)
 
 // The span routine on the instruction set chosen at load.
 template <class P, class Src, class Taps>
 void filterSpanAnySize(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
+  if constexpr (HasAvx512Form<P>::value) {
+    if (useAvx512Kernels()) return spanWith<avx512::Isa>(policy, src, out, n, taps, count);
+  }
   if (useAvx2Kernels())
     spanWith<avx2::Isa>(policy, src, out, n, taps, count);
   else

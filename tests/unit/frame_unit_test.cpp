@@ -107,10 +107,13 @@ TEST(LoadRoutine, ActsOnProcessAttachOnlyAndAlwaysSucceeds) {
   struct Case {
     uint32_t mask;
     int flag;
-    bool avx2;
-  } cases[] = {{0x30, 1, false}, {0xFFFFFFFF, 1, true}, {0x10, 0, false},  {0x20, 0, false},
-               {0, 0, false},    {0x3F, 1, false},      {0x700, 0, true},   {0x500, 0, false},
-               {0x600, 0, false}, {0x300, 0, false},    {0x400, 0, false}};
+    bool avx2, avx512;
+  } cases[] = {{0x30, 1, false, false},   {0xFFFFFFFF, 1, true, true}, {0x10, 0, false, false},
+               {0x20, 0, false, false},   {0, 0, false, false},        {0x3F, 1, false, false},
+               {0x700, 0, true, false},   {0x500, 0, false, false},    {0x600, 0, false, false},
+               {0x300, 0, false, false},  {0x400, 0, false, false},    {0x1F00, 0, true, true},
+               {0x1800, 0, false, false}, {0xF00, 0, true, false},     {0x1700, 0, true, false},
+               {0x1B00, 0, false, false}};
   for (const Case& c : cases) {
     zeltest::FaultInjection faults;
     faults.setCpuFeatures(c.mask);
@@ -118,12 +121,14 @@ TEST(LoadRoutine, ActsOnProcessAttachOnlyAndAlwaysSucceeds) {
     EXPECT_EQ(faults.cpuFeatureQueries(), 1);
     EXPECT_EQ(zelcv::cpuFeatureFlag(), c.flag) << std::hex << c.mask;
     EXPECT_EQ(zelcv::useAvx2Kernels(), c.avx2) << std::hex << c.mask;
+    EXPECT_EQ(zelcv::useAvx512Kernels(), c.avx512) << std::hex << c.mask;
     // Every other reason leaves the choices and makes no query.
     faults.setCpuFeatures(~c.mask);
     for (uint32_t reason : {0u, 2u, 3u, 4u, 99u}) {
       EXPECT_EQ(zelcv::onLibraryLoad(nullptr, reason, nullptr), 1);
       EXPECT_EQ(zelcv::cpuFeatureFlag(), c.flag);
       EXPECT_EQ(zelcv::useAvx2Kernels(), c.avx2);
+      EXPECT_EQ(zelcv::useAvx512Kernels(), c.avx512);
     }
     EXPECT_EQ(faults.cpuFeatureQueries(), 1);
   }
