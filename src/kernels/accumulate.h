@@ -226,10 +226,17 @@ class Row {
   // Masks mark regions, so most blocks are wholly unselected (skipped: their
   // sources need not be read nor their accumulator touched) or wholly
   // selected (updated without selecting); only blocks at region edges select
-  // lane by lane.
+  // lane by lane. The skipped runs leave holes in every stream that the
+  // hardware prefetchers follow poorly, so masked rows ask ahead themselves,
+  // every line of each stream that a block spans (no fault past the end).
+  // Rows without a mask run faster without.
   template <StoreMode M>
   void block(int x) {
     if constexpr (kMasked) {
+      prefetch(acc_ + x);
+      prefetch(src1_ + x);
+      if (kSources == 2) prefetch(src2_ + x);
+      prefetch(mask_ + x);
       const Selection selected = Block::selection(mask_ + x);
       if (selected == Selection::None) return;
       if (selected == Selection::All) return update<Block, M, false>(x);
@@ -247,6 +254,13 @@ class Row {
   // and a + -0 differs from a + 0 when a is -0.
   static constexpr bool kExactProduct =
       Formula::kProduct && sizeof(Src) == 1 && (std::is_unsigned<Src>::value || kSources == 1);
+
+  static constexpr int kPrefetchAhead = 256;  // pixels
+  template <typename T>
+  static void prefetch(const T* p) {
+    for (int i = 0; i < kBlock; i += 64 / int(sizeof(T)))
+      _mm_prefetch(reinterpret_cast<const char*>(p + kPrefetchAhead + i), _MM_HINT_T0);
+  }
 
   const Src* second() const { return kSources == 2 ? src2_ : src1_; }
 
