@@ -4,10 +4,24 @@
 #include "kernels/simd_avx2.h"
 
 namespace zelcv {
+namespace avx2 {
+
+// The 256-bit floats of the blocks, with the product formed as a fused
+// multiply-add of -0: x * y + -0 rounds once, exactly as x * y does (an
+// exact zero product keeps its sign), but some processors take a slow
+// assisted path for a plain product that underflows and not for the fused
+// form. Running averages of dark pixels settle on subnormal values and stay
+// there, so such products come up in every call.
+struct AccumulatorFloats : simd::Vec<float, Isa> {
+  static Raw mul(Raw a, Raw b) { return _mm256_fmadd_ps(a, b, _mm256_set1_ps(-0.0f)); }
+};
+
+}  // namespace avx2
+
 namespace accumulate {
 
 template <> struct Kit<avx2::Isa> {
-  using V = simd::Vec<float, avx2::Isa>;
+  using V = avx2::AccumulatorFloats;
   static constexpr int kVectors = 4;
 
   static __m128i load8(const void* p) { return _mm_loadl_epi64(static_cast<const __m128i*>(p)); }
@@ -48,6 +62,11 @@ template <> struct Kit<avx2::Isa> {
     for (int i = 0; i < 4; ++i)
       keep[i] = _mm256_castsi256_ps(
           _mm256_cmpeq_epi32(_mm256_cvtepu8_epi32(load8(mask + 8 * i)), _mm256_setzero_si256()));
+  }
+  static Selection selection(const uint8_t* mask) {
+    __m256i m = _mm256_loadu_si256(reinterpret_cast<const __m256i*>(mask));
+    const int zeros = _mm256_movemask_epi8(_mm256_cmpeq_epi8(m, _mm256_setzero_si256()));
+    return selectionOf<avx2::Isa>(uint32_t(zeros), 0xFFFFFFFFu);
   }
   static __m256 select(__m256 keep, __m256 old, __m256 updated) { return _mm256_blendv_ps(updated, old, keep); }
 };

@@ -110,6 +110,13 @@ template <typename Isa> struct Quad {
   static __m128 select(__m128 keep, __m128 old, __m128 updated) { return S::select(keep, old, updated); }
 };
 
+// What the mask of a block selects, from the bits of its zero mask bytes.
+enum class Selection { None, Some, All };
+template <typename Isa>
+Selection selectionOf(uint32_t zeroBits, uint32_t allBits) {
+  return zeroBits == allBits ? Selection::None : zeroBits == 0 ? Selection::All : Selection::Some;
+}
+
 // The full-width helpers: a block is kVectors vectors of V. The baseline's
 // are here; the AVX2 ones in accumulate_avx2.h.
 template <typename Isa> struct Kit;
@@ -152,6 +159,10 @@ template <> struct Kit<simd::Sse2> {
     keep[1] = _mm_castsi128_ps(_mm_unpackhi_epi16(l, l));
     keep[2] = _mm_castsi128_ps(_mm_unpacklo_epi16(h, h));
     keep[3] = _mm_castsi128_ps(_mm_unpackhi_epi16(h, h));
+  }
+  static Selection selection(const uint8_t* mask) {
+    const int zeros = _mm_movemask_epi8(_mm_cmpeq_epi8(S::loadu(mask), _mm_setzero_si128()));
+    return selectionOf<Isa>(uint32_t(zeros), 0xFFFF);
   }
   static __m128 select(__m128 keep, __m128 old, __m128 updated) { return S::select(keep, old, updated); }
 };
@@ -212,25 +223,30 @@ class Row {
     out_[x] = f_.template apply<Scalar<Isa>>(acc_[x], s1, kSources == 2 ? float(src2_[x]) : s1);
   }
 
-  // Masked blocks always select lane by lane: a branch on all-zero or
-  // all-set masks costs more in mispredictions at region edges than it saves.
+  // Masks mark regions, so most blocks are wholly unselected (skipped: their
+  // sources need not be read nor their accumulator touched) or wholly
+  // selected (updated without selecting); only blocks at region edges select
+  // lane by lane. The skipped runs leave holes in every stream that the
+  // hardware prefetchers follow poorly, so masked rows ask ahead themselves,
+  // every line of each stream that a block spans (no fault past the end).
+  // Rows without a mask run faster without.
   template <StoreMode M>
   void block(int x) {
-    if (kSources == 2 || kMasked) {
-      // With three or four streams to read, the hardware prefetchers alone
-      // leave the memory idle between requests: ask ahead, every line of
-      // each stream that a block spans (no fault past the end).
+    if constexpr (kMasked) {
       prefetch(acc_ + x);
       prefetch(src1_ + x);
       if (kSources == 2) prefetch(src2_ + x);
-      if (kMasked) prefetch(mask_ + x);
+      prefetch(mask_ + x);
+      const Selection selected = Block::selection(mask_ + x);
+      if (selected == Selection::None) return;
+      if (selected == Selection::All) return update<Block, M, false>(x);
     }
-    update<Block, M>(x);
+    update<Block, M, kMasked>(x);
   }
 
   template <StoreMode M>
   void part(int x) {
-    update<Part, M>(x);
+    update<Part, M, kMasked>(x);
   }
 
  private:
@@ -249,7 +265,7 @@ class Row {
   const Src* second() const { return kSources == 2 ? src2_ : src1_; }
 
   // Kit::kVectors vectors from pixel x on.
-  template <typename K, StoreMode M>
+  template <typename K, StoreMode M, bool kSelect>
   void update(int x) {
     using V = typename K::V;
     constexpr int n = K::kVectors;
@@ -260,7 +276,7 @@ class Row {
       K::toFloat(src1_ + x, s1);
       if (kSources == 2) K::toFloat(src2_ + x, s2);
     }
-    if constexpr (kMasked) K::keepLanes(mask_ + x, keep);
+    if constexpr (kSelect) K::keepLanes(mask_ + x, keep);
     for (int i = 0; i < n; ++i) {
       const int at = x + i * V::kLanes;
       typename V::Raw a = kInPlace ? V::load(acc_ + at) : V::loadu(acc_ + at);
@@ -269,7 +285,7 @@ class Row {
         r = V::add(a, s1[i]);
       else
         r = f_.template apply<V>(a, s1[i], kSources == 2 ? s2[i] : s1[i]);
-      if constexpr (kMasked) r = K::select(keep[i], a, r);
+      if constexpr (kSelect) r = K::select(keep[i], a, r);
       simd::put<M, V>(out_ + at, r);
     }
   }

@@ -88,6 +88,8 @@ T randomValue(std::mt19937& rng) {
       case 2: return -0.0f;
       case 3: return 0.0f;
       case 4: return std::numeric_limits<float>::denorm_min();
+      // Products of two of these, or with a small alpha, underflow.
+      case 5: return std::uniform_real_distribution<float>(-1e-20f, 1e-20f)(rng);
       default: return std::uniform_real_distribution<float>(-3000.0f, 3000.0f)(rng);
     }
   } else {
@@ -134,13 +136,20 @@ struct Image {
   }
 };
 
-// Mask patterns: about half set, none, all, few set, few unset.
-constexpr int kMaskPatterns = 5;
+// Mask patterns: about half set, none, all, few set, few unset, and runs of
+// set and unset pixels (whole vector blocks unselected beside mixed ones).
+constexpr int kMaskPatterns = 6;
 void fillMask(Image<uint8_t>& mask, std::mt19937& rng, int pattern) {
+  bool inRun = rng() % 2 == 0;
+  int runLeft = 0;
   for (int y = 0; y < mask.layout.height; ++y)
     for (int x = 0; x < mask.layout.width; ++x) {
       uint8_t set = uint8_t(std::uniform_int_distribution<int>(1, 255)(rng));
-      const bool choice[kMaskPatterns] = {rng() % 2 == 0, false, true, rng() % 8 == 0, rng() % 16 != 0};
+      if (runLeft-- == 0) {
+        inRun = !inRun;
+        runLeft = std::uniform_int_distribution<int>(0, 150)(rng);
+      }
+      const bool choice[kMaskPatterns] = {rng() % 2 == 0, false, true, rng() % 8 == 0, rng() % 16 != 0, inRun};
       bool on = choice[pattern];
       mask.row(y)[x] = on ? set : 0;
     }
@@ -182,8 +191,8 @@ std::vector<CacheAnswer> cacheAnswers(const Export& e, ZeliSize roi) {
 }
 
 float randomAlpha(std::mt19937& rng) {
-  const float special[] = {0.0f, 1.0f, 2.0f, -1.0f, 0.5f};
-  return rng() % 3 == 0 ? special[rng() % 5] : std::uniform_real_distribution<float>(0.0f, 1.0f)(rng);
+  const float special[] = {0.0f, 1.0f, 2.0f, -1.0f, 0.5f, 1e-30f};
+  return rng() % 3 == 0 ? special[rng() % 6] : std::uniform_real_distribution<float>(0.0f, 1.0f)(rng);
 }
 
 double randomConstant(std::mt19937& rng) {
