@@ -43,18 +43,56 @@ struct Width {
   using type = W;
 };
 
-// Calls body(Width<W>(), i) over [0, n) in steps of whole vectors: the
-// operation's own width, then 16 bytes when that is wider; returns where the
-// single elements start. Bodies use `W` for every load, store and operation.
+// Whole vectors over [0, n): of the operation's own width, or of 16 bytes
+// when n is shorter; the last vector ends at n and overlaps the one before
+// rather than leaving single elements. Each helper returns where the single
+// elements start (0 when n is below 16 bytes, else n). Bodies use `W` for
+// every load, store and operation.
+//
+// vectorLoop calls body(Width<W>(), i) per vector, so an element may be done
+// twice: the outputs must not be inputs of the same call.
 template <typename T, typename Op, typename Body>
 inline int vectorLoop(int n, Body&& body) {
-  using V = typename Op::V;
-  using P = simd::Vec<T>;
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) body(Width<V>(), i);
-  if (V::kLanes > P::kLanes)
-    for (; i + P::kLanes <= n; i += P::kLanes) body(Width<P>(), i);
-  return i;
+  auto cover = [&](auto w) {
+    using W = typename decltype(w)::type;
+    if (n < W::kLanes) return false;
+    for (int i = 0; i + W::kLanes < n; i += W::kLanes) body(w, i);
+    body(w, n - W::kLanes);
+    return true;
+  };
+  return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
+}
+
+// out[i..] = compute(Width<W>(), i) ascending, the last vector computed
+// before anything is stored: `out` may be a row that the computation reads
+// at or after the elements it writes.
+template <typename T, typename Op, typename Compute>
+inline int mapForward(T* out, int n, Compute&& compute) {
+  auto cover = [&](auto w) {
+    using W = typename decltype(w)::type;
+    if (n < W::kLanes) return false;
+    const auto last = compute(w, n - W::kLanes);
+    for (int i = 0; i + W::kLanes < n; i += W::kLanes) W::storeu(out + i, compute(w, i));
+    W::storeu(out + n - W::kLanes, last);
+    return true;
+  };
+  return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
+}
+
+// The same descending, the first vector computed before anything is stored:
+// `out` may be a row that the computation reads at or before the elements it
+// writes.
+template <typename T, typename Op, typename Compute>
+inline int mapBackward(T* out, int n, Compute&& compute) {
+  auto cover = [&](auto w) {
+    using W = typename decltype(w)::type;
+    if (n < W::kLanes) return false;
+    const auto first = compute(w, 0);
+    for (int i = n - W::kLanes; i > 0; i -= W::kLanes) W::storeu(out + i, compute(w, i));
+    W::storeu(out, first);
+    return true;
+  };
+  return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
 }
 
 // A kernel template instantiated for counts 1..N, indexed by the count;
@@ -74,11 +112,11 @@ template <int N, typename T, typename Op>
 void combineRowsFixed(T* out, const T* const* rows, int n) {
   const T* r[N];
   for (int k = 0; k < N; ++k) r[k] = rows[k];
-  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+  int i = mapForward<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
     auto m = W::loadu(r[0] + i);
     for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(r[k] + i));
-    W::storeu(out + i, m);
+    return m;
   });
   for (; i < n; ++i) {
     T m = r[0][i];
@@ -205,37 +243,24 @@ void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* s
 // `out` in that way only.
 template <typename T, typename Op>
 void combineForward(T* out, const T* a, const T* b, int n) {
-  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+  int i = mapForward<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
-    W::storeu(out + i, Op::template v<W>(W::loadu(a + i), W::loadu(b + i)));
+    return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
   for (; i < n; ++i) out[i] = Op::s(a[i], b[i]);
 }
 
-// out[i] = op over src[i + offsets[k]], k < N, for i < n elements.
+// out[i] = op over src[i + offsets[k]], k < N, for i < n elements; in
+// place (src == out) when no offset is negative.
 template <int N, typename T, typename Op>
 void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
-  using V = typename Op::V;
   int o[N];
   for (int k = 0; k < N; ++k) o[k] = offsets[k];
-  int i = 0;
-  // Two vectors per step; both are loaded before either is stored, which
-  // keeps the in-place use with forward offsets valid.
-  for (; i + 2 * V::kLanes <= n; i += 2 * V::kLanes) {
-    auto m = V::loadu(src + i + o[0]);
-    auto m2 = V::loadu(src + i + V::kLanes + o[0]);
-    for (int k = 1; k < N; ++k) {
-      m = Op::v(m, V::loadu(src + i + o[k]));
-      m2 = Op::v(m2, V::loadu(src + i + V::kLanes + o[k]));
-    }
-    V::storeu(out + i, m);
-    V::storeu(out + i + V::kLanes, m2);
-  }
-  i += vectorLoop<T, Op>(n - i, [&, i](auto w, int j) {
+  int i = mapForward<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
-    auto m = W::loadu(src + i + j + o[0]);
-    for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(src + i + j + o[k]));
-    W::storeu(out + i + j, m);
+    auto m = W::loadu(src + i + o[0]);
+    for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(src + i + o[k]));
+    return m;
   });
   for (; i < n; ++i) {
     T m = src[i + o[0]];
@@ -259,12 +284,9 @@ void windowFixed(const T* src, T* out, int n, int step) {
 // long as b - a <= shift.
 template <typename T, typename Op>
 void combineBackward(T* out, const T* a, const T* b, int n) {
-  // Whole vectors from the end down; the elements left over at the start go
-  // last, one by one.
-  const int vectors = vectorLoop<T, Op>(n, [&](auto w, int j) {
+  const int vectors = mapBackward<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
-    const int i = n - j - W::kLanes;
-    W::storeu(out + i, Op::template v<W>(W::loadu(a + i), W::loadu(b + i)));
+    return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
   for (int i = n - vectors; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
 }
