@@ -302,77 +302,139 @@ void windowOffsets(const T* src, T* out, int n, const int* offsets, int count) {
   CountTableTo<WindowOffsets, T, Op, 15>::kernel[count](src, out, n, offsets);
 }
 
-// Generic window of K pixels over `pixels` source pixels (K <= pixels):
-// writes the pixels - K + 1 window results to out[shift..] (elements).
-// Windows of 4, 16, 64, ... pixels are built in `temp` (pixels - 1 pixels of
-// room, distinct from out), then at most nine of them, the last overlapping,
-// make each result. Without a temp row the windows are built in place in out
-// (doubling) and moved.
+// Window results near the row ends, a vector at a time: out[j] = op over
+// R[clamp(j + base + offsets[k])], k < count, for the elements j of whole
+// vectors covering [e0, e1) inside a row of rowLen elements, where clamping
+// replaces an element before R's first pixel or after its last (R has lenR
+// elements, c per pixel) by the same channel of that pixel. Vectors that
+// reach past the row end or start are read from two small copies of R's ends
+// with a vector's worth of replicated pixels outside them; a vector may also
+// compute elements beside [e0, e1) by the same rule. Needs rowLen and lenR of
+// at least one vector, and c of 1 to 4.
 template <typename T, typename Op>
-void windowDoubling(const T* src, T* out, int pixels, int K, int channels, int shift, T* temp) {
-  const int c = channels, n = (pixels - K + 1) * c;
-  int offsets[10];
-  if (K <= 8 && !(temp && K >= 6)) {
-    for (int k = 0; k < K; ++k) offsets[k] = k * c;
-    windowOffsets<T, Op>(src, out + shift, n, offsets, K);
-    return;
-  }
-  if (temp) {
-    windowFixed<4, T, Op>(src, temp, (pixels - 3) * c, c);
-    int t = 4;
-    for (; K / t > 8; t *= 4) windowFixed<4, T, Op>(temp, temp, (pixels - 4 * t + 1) * c, t * c);
-    int count = 0;
-    for (int k = 0; k + t <= K; k += t) offsets[count++] = k * c;
-    if (K % t) offsets[count++] = (K - t) * c;
-    windowOffsets<T, Op>(temp, out + shift, n, offsets, count);
-    return;
-  }
-  windowFixed<4, T, Op>(src, out, (pixels - 3) * c, c);
-  int t = 4;
-  for (; 4 * t <= K; t *= 4) windowFixed<4, T, Op>(out, out, (pixels - 4 * t + 1) * c, t * c);
-  for (; 2 * t <= K; t *= 2) windowFixed<2, T, Op>(out, out, (pixels - 2 * t + 1) * c, t * c);
-  const int d = (K - t) * c;  // the second window's offset
-  if (d == 0) {
-    if (shift) memmove(out + shift, out, sizeof(T) * size_t(n));
-  } else if (shift == 0) {
-    combineForward<T, Op>(out, out, out + d, n);
-  } else if (d <= shift) {
-    combineBackward<T, Op>(out + shift, out, out + d, n);
+void windowEnds(const T* R, int lenR, int c, T* out, int rowLen, int e0, int e1, int base, const int* offsets,
+                int count) {
+  using V = typename Op::V;
+  constexpr int L = V::kLanes;
+  const int M = (L + 2 * c - 2) / c * c;  // margin: whole pixels, at least L + c - 1 elements
+  T head[2 * L + 6], tail[2 * L + 6];     // margin + L elements of R, then L of R + margin
+  V::storeu(head + M, V::loadu(R));
+  V::storeu(tail, V::loadu(R + lenR - L));
+  if (c == 1) {  // the margins in two vectors each
+    V::storeu(head, V::set1(R[0]));
+    V::storeu(head + M - L, V::set1(R[0]));
+    V::storeu(tail + L, V::set1(R[lenR - 1]));
+    V::storeu(tail + M, V::set1(R[lenR - 1]));
   } else {
-    combineForward<T, Op>(out, out, out + d, n);
-    memmove(out + shift, out, sizeof(T) * size_t(n));
+    for (int i = 0, ch = 0; i < M; ++i, ch = ch + 1 < c ? ch + 1 : 0) {
+      head[i] = R[ch];
+      tail[L + i] = R[lenR - c + ch];
+    }
   }
+  auto vectorAt = [&](int j) {
+    // Offsets are whole pixels: every vector read wholly outside R starts
+    // at the same channel.
+    const int phase = ((j + base) % c + c) % c;
+    auto load = [&](int p) {  // the vector at R[p], clamped
+      if (p >= 0 && p + L <= lenR) return V::loadu(R + p);
+      if (p < 0) return V::loadu(p > -L ? head + M + p : head + phase);
+      return V::loadu(p < lenR ? tail + (p - (lenR - L)) : tail + L + phase);
+    };
+    auto m = load(j + base + offsets[0]);
+    for (int k = 1; k < count; ++k) m = Op::v(m, load(j + base + offsets[k]));
+    V::storeu(out + j, m);
+  };
+  if (e1 - e0 < L) {
+    vectorAt(e0 + L <= rowLen ? e0 : rowLen - L);
+    return;
+  }
+  for (int j = e0; j + L < e1; j += L) vectorAt(j);
+  vectorAt(e1 - L);
 }
 
+// Narrower windows leave few results near the row ends, and the running
+// extremes make them quicker than the clamped copies of windowEnds.
+constexpr int kVectorEnds = 16;
+
 // One row of the horizontal pass: out[x] = op over src[clamp(x + s + k)],
-// with one kernel per width 1..15 on rows at least twice the width (widths of
-// six or more go through four-pixel windows when a scratch row is given) and
-// the generic kernel otherwise;
 // k < K, x < width, clamping to the row (the replicated border). The caller
 // has clipped s and s + K - 1 to [-(width - 1), width - 1]. `temp` (null or a
-// row of `width` pixels other than out) speeds up wide windows.
+// row of `width` pixels other than out) speeds up wide windows; out is not
+// src.
+//
+// Widths 1..15 on rows at least twice the width (and up to 8 on any row)
+// combine K source pixels per result, one kernel per width; with a scratch
+// row, widths of six or more build windows of 4, 16, 64, ... pixels in it,
+// and at most nine of them, the last overlapping, make each result. The
+// results whose windows reach past a row end come from the same rows with
+// clamped positions, as long as the clamped window is at least as wide as
+// the built ones and the window is wide; the others, and all of them without
+// a scratch row (where the windows double in place in out), are running
+// extremes.
 template <typename T, typename Op>
 void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* temp = nullptr) {
+  using V = typename Op::V;
   const int c = channels;
   int xl = s < 0 ? -s : 0;
   int xr = width - K - s + 1;
   if (xr > width) xr = width;
   if (xr < xl) xr = xl;
+  int xs = xl, xe = xr;  // running extremes for [0, xs) and [xe, width)
   if (xr > xl) {
-    const int n = xr - xl;
-    if (K < 16 && width >= 2 * K && !(temp && K >= 6)) {
-      int offsets[15];
-      for (int k = 0; k < K; ++k) offsets[k] = k * c;
-      windowOffsets<T, Op>(src + (xl + s) * c, out + xl * c, n * c, offsets, K);
+    const int n = (xr - xl) * c, pixels = xr - xl + K - 1;
+    const T* from = src + (xl + s) * c;  // the source of the first result
+    const T* R = nullptr;                // windows of t pixels, from `from` on
+    int offsets[15], count = 0, t = 1;
+    if ((K <= 8 || (K < 16 && width >= 2 * K)) && !(temp && K >= 6)) {
+      R = from;
+      for (; count < K; ++count) offsets[count] = count * c;
+    } else if (temp) {
+      windowFixed<4, T, Op>(from, temp, (pixels - 3) * c, c);
+      for (t = 4; K / t > 8; t *= 4) windowFixed<4, T, Op>(temp, temp, (pixels - 4 * t + 1) * c, t * c);
+      for (int k = 0; k + t <= K; k += t) offsets[count++] = k * c;
+      if (K % t) offsets[count++] = (K - t) * c;
+      R = temp;
     } else {
-      windowDoubling<T, Op>(src + (xl + s) * c, out, n + K - 1, K, c, xl * c, temp);
+      windowFixed<4, T, Op>(from, out, (pixels - 3) * c, c);
+      for (t = 4; 4 * t <= K; t *= 4) windowFixed<4, T, Op>(out, out, (pixels - 4 * t + 1) * c, t * c);
+      for (; 2 * t <= K; t *= 2) windowFixed<2, T, Op>(out, out, (pixels - 2 * t + 1) * c, t * c);
+      const int d = (K - t) * c, shift = xl * c;  // the second window's offset; where results go
+      if (d == 0) {
+        if (shift) memmove(out + shift, out, sizeof(T) * size_t(n));
+      } else if (shift == 0) {
+        combineForward<T, Op>(out, out, out + d, n);
+      } else if (d <= shift) {
+        combineBackward<T, Op>(out + shift, out, out + d, n);
+      } else {
+        combineForward<T, Op>(out, out, out + d, n);
+        memmove(out + shift, out, sizeof(T) * size_t(n));
+      }
+    }
+    if (R) {
+      // The ends first: their scratch copies are read back at once, which
+      // is quicker before the row's own stores.
+      const int lenR = (pixels - t + 1) * c;
+      if (K >= kVectorEnds && width * c >= V::kLanes && lenR >= V::kLanes) {
+        // Clamped windows narrower than t would take in pixels outside them.
+        const int xv = t > 1 && t - s - K > 0 ? t - s - K : 0;
+        const int xw = t > 1 && width - s - t + 1 < width ? width - s - t + 1 : width;
+        if (xv < xl) {
+          windowEnds<T, Op>(R, lenR, c, out, width * c, xv * c, xl * c, -xl * c, offsets, count);
+          xs = xv;
+        }
+        if (xr < xw) {
+          windowEnds<T, Op>(R, lenR, c, out, width * c, xr * c, xw * c, -xl * c, offsets, count);
+          xe = xw;
+        }
+      }
+      windowOffsets<T, Op>(R, out + xl * c, n, offsets, count);
     }
   }
-  // Windows that reach past a row end: running prefix and suffix extremes.
+  // Running prefix and suffix extremes for the rest.
   for (int ch = 0; ch < c; ++ch) {
     int upTo = 0;
     T run = src[ch];
-    for (int x = 0; x < xl; ++x) {
+    for (int x = 0; x < xs; ++x) {
       int b = x + s + K - 1;
       if (b > width - 1) b = width - 1;
       for (; upTo < b; ++upTo) run = Op::s(run, src[(upTo + 1) * c + ch]);
@@ -380,7 +442,7 @@ void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* t
     }
     int from = width - 1;
     run = src[from * c + ch];
-    for (int x = width - 1; x >= xr; --x) {
+    for (int x = width - 1; x >= xe; --x) {
       int a = x + s;
       if (a < 0) a = 0;
       for (; from > a; --from) run = Op::s(run, src[(from - 1) * c + ch]);
