@@ -63,41 +63,27 @@ inline int vectorLoop(int n, Body&& body) {
   return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
 }
 
-// out[i..] = compute(Width<W>(), i) ascending, the last vector computed
-// before anything is stored: `out` may be a row that the computation reads
-// at or after the elements it writes.
-template <typename T, typename Op, typename Compute>
-inline int mapForward(T* out, int n, Compute&& compute) {
+// out[i..] = compute(Width<W>(), i), ascending with the last vector
+// computed before anything is stored, so that `out` may be a row that the
+// computation reads at or after the elements it writes; or descending
+// (`Down`) with the first vector held back, for rows read at or before them.
+template <typename T, typename Op, bool Down = false, typename Compute>
+inline int mapVectors(T* out, int n, Compute&& compute) {
   auto cover = [&](auto w) {
     using W = typename decltype(w)::type;
-    if (n < W::kLanes) return false;
-    if (n % W::kLanes == 0) {  // no overlap: plain order, kinder to the prefetcher
-      for (int i = 0; i < n; i += W::kLanes) W::storeu(out + i, compute(w, i));
+    constexpr int L = W::kLanes;
+    if (n < L) return false;
+    const int start = Down ? n - L : 0, step = Down ? -L : L, held = Down ? 0 : n - L;
+    auto run = [&]() {  // the n / L vectors that do not overlap
+      for (int i = start, k = n / L; k > 0; --k, i += step) W::storeu(out + i, compute(w, i));
+    };
+    if (n % L == 0) {  // plain order, kinder to the prefetcher
+      run();
       return true;
     }
-    const auto last = compute(w, n - W::kLanes);
-    for (int i = 0; i + W::kLanes < n; i += W::kLanes) W::storeu(out + i, compute(w, i));
-    W::storeu(out + n - W::kLanes, last);
-    return true;
-  };
-  return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
-}
-
-// The same descending, the first vector computed before anything is stored:
-// `out` may be a row that the computation reads at or before the elements it
-// writes.
-template <typename T, typename Op, typename Compute>
-inline int mapBackward(T* out, int n, Compute&& compute) {
-  auto cover = [&](auto w) {
-    using W = typename decltype(w)::type;
-    if (n < W::kLanes) return false;
-    if (n % W::kLanes == 0) {
-      for (int i = n - W::kLanes; i >= 0; i -= W::kLanes) W::storeu(out + i, compute(w, i));
-      return true;
-    }
-    const auto first = compute(w, 0);
-    for (int i = n - W::kLanes; i > 0; i -= W::kLanes) W::storeu(out + i, compute(w, i));
-    W::storeu(out, first);
+    const auto last = compute(w, held);
+    run();
+    W::storeu(out + held, last);
     return true;
   };
   return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
@@ -120,7 +106,7 @@ template <int N, typename T, typename Op>
 void combineRowsFixed(T* out, const T* const* rows, int n) {
   const T* r[N];
   for (int k = 0; k < N; ++k) r[k] = rows[k];
-  int i = mapForward<T, Op>(out, n, [&](auto w, int i) {
+  int i = mapVectors<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
     auto m = W::loadu(r[0] + i);
     for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(r[k] + i));
@@ -251,7 +237,7 @@ void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* s
 // `out` in that way only.
 template <typename T, typename Op>
 void combineForward(T* out, const T* a, const T* b, int n) {
-  int i = mapForward<T, Op>(out, n, [&](auto w, int i) {
+  int i = mapVectors<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
     return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
@@ -264,7 +250,7 @@ template <int N, typename T, typename Op>
 void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
   int o[N];
   for (int k = 0; k < N; ++k) o[k] = offsets[k];
-  int i = mapForward<T, Op>(out, n, [&](auto w, int i) {
+  int i = mapVectors<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
     auto m = W::loadu(src + i + o[0]);
     for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(src + i + o[k]));
@@ -292,7 +278,7 @@ void windowFixed(const T* src, T* out, int n, int step) {
 // long as b - a <= shift.
 template <typename T, typename Op>
 void combineBackward(T* out, const T* a, const T* b, int n) {
-  const int vectors = mapBackward<T, Op>(out, n, [&](auto w, int i) {
+  const int vectors = mapVectors<T, Op, true>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
     return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
