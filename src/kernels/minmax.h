@@ -43,18 +43,50 @@ struct Width {
   using type = W;
 };
 
-// Calls body(Width<W>(), i) over [0, n) in steps of whole vectors: the
-// operation's own width, then 16 bytes when that is wider; returns where the
-// single elements start. Bodies use `W` for every load, store and operation.
+// Whole vectors over [0, n): of the operation's own width, or of 16 bytes
+// when n is shorter; the last vector ends at n and overlaps the one before
+// rather than leaving single elements. Each helper returns where the single
+// elements start (0 when n is below 16 bytes, else n). Bodies use `W` for
+// every load, store and operation.
+//
+// vectorLoop calls body(Width<W>(), i) per vector, so an element may be done
+// twice: the outputs must not be inputs of the same call.
 template <typename T, typename Op, typename Body>
 inline int vectorLoop(int n, Body&& body) {
-  using V = typename Op::V;
-  using P = simd::Vec<T>;
-  int i = 0;
-  for (; i + V::kLanes <= n; i += V::kLanes) body(Width<V>(), i);
-  if (V::kLanes > P::kLanes)
-    for (; i + P::kLanes <= n; i += P::kLanes) body(Width<P>(), i);
-  return i;
+  auto cover = [&](auto w) {
+    using W = typename decltype(w)::type;
+    if (n < W::kLanes) return false;
+    for (int i = 0; i + W::kLanes < n; i += W::kLanes) body(w, i);
+    body(w, n - W::kLanes);
+    return true;
+  };
+  return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
+}
+
+// out[i..] = compute(Width<W>(), i), ascending with the last vector
+// computed before anything is stored, so that `out` may be a row that the
+// computation reads at or after the elements it writes; or descending
+// (`Down`) with the first vector held back, for rows read at or before them.
+template <typename T, typename Op, bool Down = false, typename Compute>
+inline int mapVectors(T* out, int n, Compute&& compute) {
+  auto cover = [&](auto w) {
+    using W = typename decltype(w)::type;
+    constexpr int L = W::kLanes;
+    if (n < L) return false;
+    const int start = Down ? n - L : 0, step = Down ? -L : L, held = Down ? 0 : n - L;
+    auto run = [&]() {  // the n / L vectors that do not overlap
+      for (int i = start, k = n / L; k > 0; --k, i += step) W::storeu(out + i, compute(w, i));
+    };
+    if (n % L == 0) {  // plain order, kinder to the prefetcher
+      run();
+      return true;
+    }
+    const auto last = compute(w, held);
+    run();
+    W::storeu(out + held, last);
+    return true;
+  };
+  return cover(Width<typename Op::V>()) || cover(Width<simd::Vec<T>>()) ? n : 0;
 }
 
 // A kernel template instantiated for counts 1..N, indexed by the count;
@@ -74,11 +106,11 @@ template <int N, typename T, typename Op>
 void combineRowsFixed(T* out, const T* const* rows, int n) {
   const T* r[N];
   for (int k = 0; k < N; ++k) r[k] = rows[k];
-  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+  int i = mapVectors<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
     auto m = W::loadu(r[0] + i);
     for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(r[k] + i));
-    W::storeu(out + i, m);
+    return m;
   });
   for (; i < n; ++i) {
     T m = r[0][i];
@@ -205,37 +237,24 @@ void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* s
 // `out` in that way only.
 template <typename T, typename Op>
 void combineForward(T* out, const T* a, const T* b, int n) {
-  int i = vectorLoop<T, Op>(n, [&](auto w, int i) {
+  int i = mapVectors<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
-    W::storeu(out + i, Op::template v<W>(W::loadu(a + i), W::loadu(b + i)));
+    return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
   for (; i < n; ++i) out[i] = Op::s(a[i], b[i]);
 }
 
-// out[i] = op over src[i + offsets[k]], k < N, for i < n elements.
+// out[i] = op over src[i + offsets[k]], k < N, for i < n elements; in
+// place (src == out) when no offset is negative.
 template <int N, typename T, typename Op>
 void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
-  using V = typename Op::V;
   int o[N];
   for (int k = 0; k < N; ++k) o[k] = offsets[k];
-  int i = 0;
-  // Two vectors per step; both are loaded before either is stored, which
-  // keeps the in-place use with forward offsets valid.
-  for (; i + 2 * V::kLanes <= n; i += 2 * V::kLanes) {
-    auto m = V::loadu(src + i + o[0]);
-    auto m2 = V::loadu(src + i + V::kLanes + o[0]);
-    for (int k = 1; k < N; ++k) {
-      m = Op::v(m, V::loadu(src + i + o[k]));
-      m2 = Op::v(m2, V::loadu(src + i + V::kLanes + o[k]));
-    }
-    V::storeu(out + i, m);
-    V::storeu(out + i + V::kLanes, m2);
-  }
-  i += vectorLoop<T, Op>(n - i, [&, i](auto w, int j) {
+  int i = mapVectors<T, Op>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
-    auto m = W::loadu(src + i + j + o[0]);
-    for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(src + i + j + o[k]));
-    W::storeu(out + i + j, m);
+    auto m = W::loadu(src + i + o[0]);
+    for (int k = 1; k < N; ++k) m = Op::template v<W>(m, W::loadu(src + i + o[k]));
+    return m;
   });
   for (; i < n; ++i) {
     T m = src[i + o[0]];
@@ -259,12 +278,9 @@ void windowFixed(const T* src, T* out, int n, int step) {
 // long as b - a <= shift.
 template <typename T, typename Op>
 void combineBackward(T* out, const T* a, const T* b, int n) {
-  // Whole vectors from the end down; the elements left over at the start go
-  // last, one by one.
-  const int vectors = vectorLoop<T, Op>(n, [&](auto w, int j) {
+  const int vectors = mapVectors<T, Op, true>(out, n, [&](auto w, int i) {
     using W = typename decltype(w)::type;
-    const int i = n - j - W::kLanes;
-    W::storeu(out + i, Op::template v<W>(W::loadu(a + i), W::loadu(b + i)));
+    return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
   for (int i = n - vectors; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
 }
@@ -280,77 +296,139 @@ void windowOffsets(const T* src, T* out, int n, const int* offsets, int count) {
   CountTableTo<WindowOffsets, T, Op, 15>::kernel[count](src, out, n, offsets);
 }
 
-// Generic window of K pixels over `pixels` source pixels (K <= pixels):
-// writes the pixels - K + 1 window results to out[shift..] (elements).
-// Windows of 4, 16, 64, ... pixels are built in `temp` (pixels - 1 pixels of
-// room, distinct from out), then at most nine of them, the last overlapping,
-// make each result. Without a temp row the windows are built in place in out
-// (doubling) and moved.
+// Window results near the row ends, a vector at a time: out[j] = op over
+// R[clamp(j + base + offsets[k])], k < count, for the elements j of whole
+// vectors covering [e0, e1) inside a row of rowLen elements, where clamping
+// replaces an element before R's first pixel or after its last (R has lenR
+// elements, c per pixel) by the same channel of that pixel. Vectors that
+// reach past the row end or start are read from two small copies of R's ends
+// with a vector's worth of replicated pixels outside them; a vector may also
+// compute elements beside [e0, e1) by the same rule. Needs rowLen and lenR of
+// at least one vector, and c of 1 to 4.
 template <typename T, typename Op>
-void windowDoubling(const T* src, T* out, int pixels, int K, int channels, int shift, T* temp) {
-  const int c = channels, n = (pixels - K + 1) * c;
-  int offsets[10];
-  if (K <= 8 && !(temp && K >= 6)) {
-    for (int k = 0; k < K; ++k) offsets[k] = k * c;
-    windowOffsets<T, Op>(src, out + shift, n, offsets, K);
-    return;
-  }
-  if (temp) {
-    windowFixed<4, T, Op>(src, temp, (pixels - 3) * c, c);
-    int t = 4;
-    for (; K / t > 8; t *= 4) windowFixed<4, T, Op>(temp, temp, (pixels - 4 * t + 1) * c, t * c);
-    int count = 0;
-    for (int k = 0; k + t <= K; k += t) offsets[count++] = k * c;
-    if (K % t) offsets[count++] = (K - t) * c;
-    windowOffsets<T, Op>(temp, out + shift, n, offsets, count);
-    return;
-  }
-  windowFixed<4, T, Op>(src, out, (pixels - 3) * c, c);
-  int t = 4;
-  for (; 4 * t <= K; t *= 4) windowFixed<4, T, Op>(out, out, (pixels - 4 * t + 1) * c, t * c);
-  for (; 2 * t <= K; t *= 2) windowFixed<2, T, Op>(out, out, (pixels - 2 * t + 1) * c, t * c);
-  const int d = (K - t) * c;  // the second window's offset
-  if (d == 0) {
-    if (shift) memmove(out + shift, out, sizeof(T) * size_t(n));
-  } else if (shift == 0) {
-    combineForward<T, Op>(out, out, out + d, n);
-  } else if (d <= shift) {
-    combineBackward<T, Op>(out + shift, out, out + d, n);
+void windowEnds(const T* R, int lenR, int c, T* out, int rowLen, int e0, int e1, int base, const int* offsets,
+                int count) {
+  using V = typename Op::V;
+  constexpr int L = V::kLanes;
+  const int M = (L + 2 * c - 2) / c * c;  // margin: whole pixels, at least L + c - 1 elements
+  T head[2 * L + 6], tail[2 * L + 6];     // margin + L elements of R, then L of R + margin
+  V::storeu(head + M, V::loadu(R));
+  V::storeu(tail, V::loadu(R + lenR - L));
+  if (c == 1) {  // the margins in two vectors each
+    V::storeu(head, V::set1(R[0]));
+    V::storeu(head + M - L, V::set1(R[0]));
+    V::storeu(tail + L, V::set1(R[lenR - 1]));
+    V::storeu(tail + M, V::set1(R[lenR - 1]));
   } else {
-    combineForward<T, Op>(out, out, out + d, n);
-    memmove(out + shift, out, sizeof(T) * size_t(n));
+    for (int i = 0, ch = 0; i < M; ++i, ch = ch + 1 < c ? ch + 1 : 0) {
+      head[i] = R[ch];
+      tail[L + i] = R[lenR - c + ch];
+    }
   }
+  auto vectorAt = [&](int j) {
+    // Offsets are whole pixels: every vector read wholly outside R starts
+    // at the same channel.
+    const int phase = ((j + base) % c + c) % c;
+    auto load = [&](int p) {  // the vector at R[p], clamped
+      if (p >= 0 && p + L <= lenR) return V::loadu(R + p);
+      if (p < 0) return V::loadu(p > -L ? head + M + p : head + phase);
+      return V::loadu(p < lenR ? tail + (p - (lenR - L)) : tail + L + phase);
+    };
+    auto m = load(j + base + offsets[0]);
+    for (int k = 1; k < count; ++k) m = Op::v(m, load(j + base + offsets[k]));
+    V::storeu(out + j, m);
+  };
+  if (e1 - e0 < L) {
+    vectorAt(e0 + L <= rowLen ? e0 : rowLen - L);
+    return;
+  }
+  for (int j = e0; j + L < e1; j += L) vectorAt(j);
+  vectorAt(e1 - L);
 }
 
+// Narrower windows leave few results near the row ends, and the running
+// extremes make them quicker than the clamped copies of windowEnds.
+constexpr int kVectorEnds = 16;
+
 // One row of the horizontal pass: out[x] = op over src[clamp(x + s + k)],
-// with one kernel per width 1..15 on rows at least twice the width (widths of
-// six or more go through four-pixel windows when a scratch row is given) and
-// the generic kernel otherwise;
 // k < K, x < width, clamping to the row (the replicated border). The caller
 // has clipped s and s + K - 1 to [-(width - 1), width - 1]. `temp` (null or a
-// row of `width` pixels other than out) speeds up wide windows.
+// row of `width` pixels other than out) speeds up wide windows; out is not
+// src.
+//
+// Widths 1..15 on rows at least twice the width (and up to 8 on any row)
+// combine K source pixels per result, one kernel per width; with a scratch
+// row, widths of six or more build windows of 4, 16, 64, ... pixels in it,
+// and at most nine of them, the last overlapping, make each result. The
+// results whose windows reach past a row end come from the same rows with
+// clamped positions, as long as the clamped window is at least as wide as
+// the built ones and the window is wide; the others, and all of them without
+// a scratch row (where the windows double in place in out), are running
+// extremes.
 template <typename T, typename Op>
 void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* temp = nullptr) {
+  using V = typename Op::V;
   const int c = channels;
   int xl = s < 0 ? -s : 0;
   int xr = width - K - s + 1;
   if (xr > width) xr = width;
   if (xr < xl) xr = xl;
+  int xs = xl, xe = xr;  // running extremes for [0, xs) and [xe, width)
   if (xr > xl) {
-    const int n = xr - xl;
-    if (K < 16 && width >= 2 * K && !(temp && K >= 6)) {
-      int offsets[15];
-      for (int k = 0; k < K; ++k) offsets[k] = k * c;
-      windowOffsets<T, Op>(src + (xl + s) * c, out + xl * c, n * c, offsets, K);
+    const int n = (xr - xl) * c, pixels = xr - xl + K - 1;
+    const T* from = src + (xl + s) * c;  // the source of the first result
+    const T* R = nullptr;                // windows of t pixels, from `from` on
+    int offsets[15], count = 0, t = 1;
+    if ((K <= 8 || (K < 16 && width >= 2 * K)) && !(temp && K >= 6)) {
+      R = from;
+      for (; count < K; ++count) offsets[count] = count * c;
+    } else if (temp) {
+      windowFixed<4, T, Op>(from, temp, (pixels - 3) * c, c);
+      for (t = 4; K / t > 8; t *= 4) windowFixed<4, T, Op>(temp, temp, (pixels - 4 * t + 1) * c, t * c);
+      for (int k = 0; k + t <= K; k += t) offsets[count++] = k * c;
+      if (K % t) offsets[count++] = (K - t) * c;
+      R = temp;
     } else {
-      windowDoubling<T, Op>(src + (xl + s) * c, out, n + K - 1, K, c, xl * c, temp);
+      windowFixed<4, T, Op>(from, out, (pixels - 3) * c, c);
+      for (t = 4; 4 * t <= K; t *= 4) windowFixed<4, T, Op>(out, out, (pixels - 4 * t + 1) * c, t * c);
+      for (; 2 * t <= K; t *= 2) windowFixed<2, T, Op>(out, out, (pixels - 2 * t + 1) * c, t * c);
+      const int d = (K - t) * c, shift = xl * c;  // the second window's offset; where results go
+      if (d == 0) {
+        if (shift) memmove(out + shift, out, sizeof(T) * size_t(n));
+      } else if (shift == 0) {
+        combineForward<T, Op>(out, out, out + d, n);
+      } else if (d <= shift) {
+        combineBackward<T, Op>(out + shift, out, out + d, n);
+      } else {
+        combineForward<T, Op>(out, out, out + d, n);
+        memmove(out + shift, out, sizeof(T) * size_t(n));
+      }
+    }
+    if (R) {
+      // The ends first: their scratch copies are read back at once, which
+      // is quicker before the row's own stores.
+      const int lenR = (pixels - t + 1) * c;
+      if (K >= kVectorEnds && width * c >= V::kLanes && lenR >= V::kLanes) {
+        // Clamped windows narrower than t would take in pixels outside them.
+        const int xv = t > 1 && t - s - K > 0 ? t - s - K : 0;
+        const int xw = t > 1 && width - s - t + 1 < width ? width - s - t + 1 : width;
+        if (xv < xl) {
+          windowEnds<T, Op>(R, lenR, c, out, width * c, xv * c, xl * c, -xl * c, offsets, count);
+          xs = xv;
+        }
+        if (xr < xw) {
+          windowEnds<T, Op>(R, lenR, c, out, width * c, xr * c, xw * c, -xl * c, offsets, count);
+          xe = xw;
+        }
+      }
+      windowOffsets<T, Op>(R, out + xl * c, n, offsets, count);
     }
   }
-  // Windows that reach past a row end: running prefix and suffix extremes.
+  // Running prefix and suffix extremes for the rest.
   for (int ch = 0; ch < c; ++ch) {
     int upTo = 0;
     T run = src[ch];
-    for (int x = 0; x < xl; ++x) {
+    for (int x = 0; x < xs; ++x) {
       int b = x + s + K - 1;
       if (b > width - 1) b = width - 1;
       for (; upTo < b; ++upTo) run = Op::s(run, src[(upTo + 1) * c + ch]);
@@ -358,7 +436,7 @@ void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* t
     }
     int from = width - 1;
     run = src[from * c + ch];
-    for (int x = width - 1; x >= xr; --x) {
+    for (int x = width - 1; x >= xe; --x) {
       int a = x + s;
       if (a < 0) a = 0;
       for (; from > a; --from) run = Op::s(run, src[(from - 1) * c + ch]);

@@ -48,12 +48,6 @@ bool overlaps(const void* src, int srcStep, const void* dst, int dstStep, int he
   return s < dEnd && d < sEnd;
 }
 
-// Asks for the next source row while the current one is processed.
-void prefetchRow(const void* row, size_t bytes) {
-  const char* p = static_cast<const char*>(row);
-  for (size_t i = 0; i < bytes; i += 64) _mm_prefetch(p + i, _MM_HINT_T0);
-}
-
 // Vertical windows up to this height combine rows directly; taller ones use
 // the van Herk scheme.
 constexpr int kDirectHeights = 9;
@@ -95,7 +89,6 @@ void rectCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
   // Not in place, the last output row is free scratch until it is written.
   T* temp = inPlace ? nullptr : outRow(H - 1);
   auto hpass = [&](int k, T* out) {
-    prefetchRow(extRow(k + 1), sizeof(T) * size_t(n));
     minmax::windowRow<T, Op>(extRow(k), out, W, c, s, K, out == temp ? nullptr : temp);
   };
   const int steps = H + Kv - 1;
@@ -204,7 +197,6 @@ void runsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, int 
   }
   for (int r = dyMin; r <= H - 1 + dyMax; ++r) {
     const int g = (r - dyMin) % span;
-    prefetchRow(srcRow(r + 1), sizeof(T) * size_t(n));
     auto runRow = [&](int j) -> const T* { return aliased(j) ? srcRow(r) : slot[g * runCount + j]; };
     for (int i = 0; i < runCount; ++i) {
       if (!planned) {
