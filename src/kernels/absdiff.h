@@ -14,6 +14,9 @@ namespace zelcv {
 namespace avx2 {
 struct Isa;
 }
+namespace avx512 {
+struct Isa;
+}
 namespace absdiff {
 
 // The scalar form, and the vector form for any instruction set's vectors.
@@ -96,10 +99,13 @@ void run(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T>
 #define ZELCV_ABSDIFF_RUN(T, Isa)                                                                         \
   void run<T, Isa>(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, \
                    int height)
-// Built in absdiff_avx2.cpp.
-extern template ZELCV_ABSDIFF_RUN(uint8_t, avx2::Isa);
-extern template ZELCV_ABSDIFF_RUN(uint16_t, avx2::Isa);
-extern template ZELCV_ABSDIFF_RUN(float, avx2::Isa);
+#define ZELCV_ABSDIFF_EXTERN(Isa)               \
+  extern template ZELCV_ABSDIFF_RUN(uint8_t, Isa);  \
+  extern template ZELCV_ABSDIFF_RUN(uint16_t, Isa); \
+  extern template ZELCV_ABSDIFF_RUN(float, Isa);
+// Built in absdiff_avx2.cpp and absdiff_avx512.cpp.
+ZELCV_ABSDIFF_EXTERN(avx2::Isa)
+ZELCV_ABSDIFF_EXTERN(avx512::Isa)
 
 }  // namespace absdiff
 }  // namespace zelcv
