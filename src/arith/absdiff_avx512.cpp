@@ -5,9 +5,7 @@
 namespace zelcv {
 namespace absdiff {
 
-template ZELCV_ABSDIFF_RUN(uint8_t, avx512::Isa);
-template ZELCV_ABSDIFF_RUN(uint16_t, avx512::Isa);
-template ZELCV_ABSDIFF_RUN(float, avx512::Isa);
+ZELCV_ABSDIFF_INSTANCES(template, avx512::Isa)
 
 }  // namespace absdiff
 }  // namespace zelcv

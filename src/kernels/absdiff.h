@@ -99,13 +99,15 @@ void run(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T>
 #define ZELCV_ABSDIFF_RUN(T, Isa)                                                                         \
   void run<T, Isa>(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, \
                    int height)
-#define ZELCV_ABSDIFF_EXTERN(Isa)               \
-  extern template ZELCV_ABSDIFF_RUN(uint8_t, Isa);  \
-  extern template ZELCV_ABSDIFF_RUN(uint16_t, Isa); \
-  extern template ZELCV_ABSDIFF_RUN(float, Isa);
+// Every instance on one instruction set, after `declare` (template, or
+// extern template).
+#define ZELCV_ABSDIFF_INSTANCES(declare, Isa) \
+  declare ZELCV_ABSDIFF_RUN(uint8_t, Isa);    \
+  declare ZELCV_ABSDIFF_RUN(uint16_t, Isa);   \
+  declare ZELCV_ABSDIFF_RUN(float, Isa);
 // Built in absdiff_avx2.cpp and absdiff_avx512.cpp.
-ZELCV_ABSDIFF_EXTERN(avx2::Isa)
-ZELCV_ABSDIFF_EXTERN(avx512::Isa)
+ZELCV_ABSDIFF_INSTANCES(extern template, avx2::Isa)
+ZELCV_ABSDIFF_INSTANCES(extern template, avx512::Isa)
 
 }  // namespace absdiff
 }  // namespace zelcv
