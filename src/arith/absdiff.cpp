@@ -18,7 +18,9 @@ StoreMode storeMode(int bytesPerPixel, ZeliSize roi) {
 
 template <typename T>
 void run(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, int height) {
-  if (useAvx2Kernels())
+  if (useAvx512Kernels())
+    absdiff::run<T, avx512::Isa>(mode, src1, src2, c, dst, width, height);
+  else if (useAvx2Kernels())
     absdiff::run<T, avx2::Isa>(mode, src1, src2, c, dst, width, height);
   else
     absdiff::run<T, simd::Sse2>(mode, src1, src2, c, dst, width, height);

@@ -5,9 +5,7 @@
 namespace zelcv {
 namespace absdiff {
 
-template ZELCV_ABSDIFF_RUN(uint8_t, avx2::Isa);
-template ZELCV_ABSDIFF_RUN(uint16_t, avx2::Isa);
-template ZELCV_ABSDIFF_RUN(float, avx2::Isa);
+ZELCV_ABSDIFF_INSTANCES(template, avx2::Isa)
 
 }  // namespace absdiff
 }  // namespace zelcv

@@ -10,7 +10,9 @@ namespace {
 
 template <int kSources, bool kMasked, bool kInPlace, typename Src, typename Formula>
 void run(StoreMode mode, const accumulate::Images<Src>& images, ZeliSize roi, Formula f) {
-  if (useAvx2Kernels())
+  if (useAvx512Kernels())
+    accumulate::run<kSources, kMasked, kInPlace, Src, Formula, avx512::Isa>(mode, images, roi.width, roi.height, f);
+  else if (useAvx2Kernels())
     accumulate::run<kSources, kMasked, kInPlace, Src, Formula, avx2::Isa>(mode, images, roi.width, roi.height, f);
   else
     accumulate::run<kSources, kMasked, kInPlace, Src, Formula, simd::Sse2>(mode, images, roi.width, roi.height, f);

@@ -22,6 +22,7 @@ namespace accumulate {
 
 template <> struct Kit<avx2::Isa> {
   using V = avx2::AccumulatorFloats;
+  using Keep = __m256;
   static constexpr int kVectors = 4;
 
   static __m128i load8(const void* p) { return _mm_loadl_epi64(static_cast<const __m128i*>(p)); }
@@ -72,7 +73,7 @@ template <> struct Kit<avx2::Isa> {
 };
 
 #define ZELCV_ACCUMULATE_INSTANTIATE(...) template ZELCV_ACCUMULATE_RUN(__VA_ARGS__)
-ZELCV_ACCUMULATE_INSTANCES(ZELCV_ACCUMULATE_INSTANTIATE)
+ZELCV_ACCUMULATE_INSTANCES(ZELCV_ACCUMULATE_INSTANTIATE, avx2::Isa)
 
 }  // namespace accumulate
 }  // namespace zelcv

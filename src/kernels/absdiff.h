@@ -14,6 +14,9 @@ namespace zelcv {
 namespace avx2 {
 struct Isa;
 }
+namespace avx512 {
+struct Isa;
+}
 namespace absdiff {
 
 // The scalar form, and the vector form for any instruction set's vectors.
@@ -47,8 +50,11 @@ class Row {
   using Part = simd::Vec<T>;  // 16 bytes whatever the block width
 
  public:
+  // Four vectors per block, but two of 512 bits: 8-bit rows of a few hundred
+  // bytes would otherwise leave much of each row to the 16-byte parts.
+  static constexpr int kVectors = Isa::kBytes >= 64 ? 2 : 4;
   static constexpr int kPart = Part::kLanes;
-  static constexpr int kBlock = 4 * V::kLanes;
+  static constexpr int kBlock = kVectors * V::kLanes;
   static constexpr int kBlockAlign = Isa::kBytes;
 
   Row(const T* src1, const T* src2, T c, T* out) : src1_(src1), src2_(src2), c_(c), out_(out) {}
@@ -59,13 +65,13 @@ class Row {
 
   template <StoreMode M>
   void block(int x) {
-    // All loads first, so that the four independent results overlap.
-    typename V::Raw a[4], b[4];
-    for (int i = 0; i < 4; ++i) {
+    // All loads first, so that the independent results overlap.
+    typename V::Raw a[kVectors], b[kVectors];
+    for (int i = 0; i < kVectors; ++i) {
       a[i] = V::loadu(src1_ + x + i * V::kLanes);
       b[i] = kConstant ? V::set1(c_) : V::loadu(src2_ + x + i * V::kLanes);
     }
-    for (int i = 0; i < 4; ++i) simd::put<M, V>(out_ + x + i * V::kLanes, Ops<T>::template vec<V>(a[i], b[i]));
+    for (int i = 0; i < kVectors; ++i) simd::put<M, V>(out_ + x + i * V::kLanes, Ops<T>::template vec<V>(a[i], b[i]));
   }
 
   template <StoreMode M>
@@ -96,10 +102,15 @@ void run(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T>
 #define ZELCV_ABSDIFF_RUN(T, Isa)                                                                         \
   void run<T, Isa>(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, \
                    int height)
-// Built in absdiff_avx2.cpp.
-extern template ZELCV_ABSDIFF_RUN(uint8_t, avx2::Isa);
-extern template ZELCV_ABSDIFF_RUN(uint16_t, avx2::Isa);
-extern template ZELCV_ABSDIFF_RUN(float, avx2::Isa);
+// Every instance on one instruction set, after `declare` (template, or
+// extern template).
+#define ZELCV_ABSDIFF_INSTANCES(declare, Isa) \
+  declare ZELCV_ABSDIFF_RUN(uint8_t, Isa);    \
+  declare ZELCV_ABSDIFF_RUN(uint16_t, Isa);   \
+  declare ZELCV_ABSDIFF_RUN(float, Isa);
+// Built in absdiff_avx2.cpp and absdiff_avx512.cpp.
+ZELCV_ABSDIFF_INSTANCES(extern template, avx2::Isa)
+ZELCV_ABSDIFF_INSTANCES(extern template, avx512::Isa)
 
 }  // namespace absdiff
 }  // namespace zelcv

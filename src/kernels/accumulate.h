@@ -6,8 +6,8 @@
 // Blocks use the instruction set's full width through Kit<Isa>: the
 // conversions of source elements to floats, exact 8-bit products and mask
 // lanes. The 128-bit parts use Quad<Isa>. Both are templates over the
-// instruction set even where the code is the same, so that an AVX2 file's
-// copies keep names of their own.
+// instruction set even where the code is the same, so that an AVX2 or
+// AVX-512 file's copies keep names of their own.
 #ifndef ZELCV_KERNELS_ACCUMULATE_H
 #define ZELCV_KERNELS_ACCUMULATE_H
 
@@ -21,6 +21,9 @@
 
 namespace zelcv {
 namespace avx2 {
+struct Isa;
+}
+namespace avx512 {
 struct Isa;
 }
 namespace accumulate {
@@ -87,6 +90,7 @@ template <typename Isa> struct QuadVec : simd::Vec<float> {};
 // conversions.
 template <typename Isa> struct Quad {
   using V = QuadVec<Isa>;
+  using Keep = __m128;
   using S = Sse<Isa>;
   static constexpr int kVectors = 1;
 
@@ -113,17 +117,19 @@ template <typename Isa> struct Quad {
 // What the mask of a block selects, from the bits of its zero mask bytes.
 enum class Selection { None, Some, All };
 template <typename Isa>
-Selection selectionOf(uint32_t zeroBits, uint32_t allBits) {
+Selection selectionOf(uint64_t zeroBits, uint64_t allBits) {
   return zeroBits == allBits ? Selection::None : zeroBits == 0 ? Selection::All : Selection::Some;
 }
 
-// The full-width helpers: a block is kVectors vectors of V. The baseline's
-// are here; the AVX2 ones in accumulate_avx2.h.
+// The full-width helpers: a block is kVectors vectors of V, and Keep says per
+// lane of a vector whether the old value stays. The baseline's are here; the
+// others in accumulate_avx2.cpp and accumulate_avx512.cpp.
 template <typename Isa> struct Kit;
 
 template <> struct Kit<simd::Sse2> {
   using Isa = simd::Sse2;
   using V = simd::Vec<float>;
+  using Keep = __m128;
   using S = Sse<Isa>;
   static constexpr int kVectors = 4;
 
@@ -269,7 +275,8 @@ class Row {
   void update(int x) {
     using V = typename K::V;
     constexpr int n = K::kVectors;
-    typename V::Raw s1[n], s2[n], keep[n];
+    typename V::Raw s1[n], s2[n];
+    typename K::Keep keep[n];
     if constexpr (kExactProduct) {
       K::exactProducts(src1_ + x, second() + x, s1);
     } else {
@@ -318,28 +325,29 @@ void run(StoreMode mode, const Images<Src>& im, int width, int height, Formula f
 }
 
 // Every instance that the exports run, as
-// X(kSources, kMasked, kInPlace, Src, Formula).
-#define ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, kSources, kMasked, Formula) \
-  X(kSources, kMasked, true, uint8_t, Formula)                          \
-  X(kSources, kMasked, true, int8_t, Formula)                           \
-  X(kSources, kMasked, true, uint16_t, Formula)                         \
-  X(kSources, kMasked, true, float, Formula)
-#define ZELCV_ACCUMULATE_INSTANCES(X)                             \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, false, Add)             \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, true, Add)              \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, false, AddSquare)       \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, true, AddSquare)        \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 2, false, AddProduct)      \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 2, true, AddProduct)       \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, false, AddWeighted)     \
-  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, 1, true, AddWeighted)      \
-  X(1, false, false, float, AddWeighted)
+// X(Isa, kSources, kMasked, kInPlace, Src, Formula).
+#define ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, kSources, kMasked, Formula) \
+  X(Isa, kSources, kMasked, true, uint8_t, Formula)                          \
+  X(Isa, kSources, kMasked, true, int8_t, Formula)                           \
+  X(Isa, kSources, kMasked, true, uint16_t, Formula)                         \
+  X(Isa, kSources, kMasked, true, float, Formula)
+#define ZELCV_ACCUMULATE_INSTANCES(X, Isa)                             \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 1, false, Add)             \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 1, true, Add)              \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 1, false, AddSquare)       \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 1, true, AddSquare)        \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 2, false, AddProduct)      \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 2, true, AddProduct)       \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 1, false, AddWeighted)     \
+  ZELCV_ACCUMULATE_EACH_SOURCE_TYPE(X, Isa, 1, true, AddWeighted)      \
+  X(Isa, 1, false, false, float, AddWeighted)
 
-#define ZELCV_ACCUMULATE_RUN(kSources, kMasked, kInPlace, Src, Formula) \
-  void run<kSources, kMasked, kInPlace, Src, Formula, avx2::Isa>(StoreMode, const Images<Src>&, int, int, Formula);
+#define ZELCV_ACCUMULATE_RUN(Isa, kSources, kMasked, kInPlace, Src, Formula) \
+  void run<kSources, kMasked, kInPlace, Src, Formula, Isa>(StoreMode, const Images<Src>&, int, int, Formula);
 #define ZELCV_ACCUMULATE_EXTERN(...) extern template ZELCV_ACCUMULATE_RUN(__VA_ARGS__)
-// Built in accumulate_avx2.cpp.
-ZELCV_ACCUMULATE_INSTANCES(ZELCV_ACCUMULATE_EXTERN)
+// Built in accumulate_avx2.cpp and accumulate_avx512.cpp.
+ZELCV_ACCUMULATE_INSTANCES(ZELCV_ACCUMULATE_EXTERN, avx2::Isa)
+ZELCV_ACCUMULATE_INSTANCES(ZELCV_ACCUMULATE_EXTERN, avx512::Isa)
 
 }  // namespace accumulate
 }  // namespace zelcv
