@@ -387,9 +387,9 @@ struct FloatDataSum {
 
   // Rows of one or three channels with a size known at compile time: each
   // element is widened once and the window of every tap is cut from two
-  // neighbouring widened vectors; widening every tap's window anew would
-  // cost N conversions per vector, the bound of the row pass. The sums are
-  // those of the block above, term for term.
+  // neighbouring widened vectors, one shuffle (two on AVX2) where widening
+  // every tap's window anew costs a conversion per tap. The sums are those
+  // of the block above, term for term.
   template <int N, class Taps>
   static void block(const FixedRowSource<float, N>& src, int i, float* out, const Taps& taps, int n) {
     if constexpr (std::is_same<Acc, double>::value) {
