@@ -3,9 +3,9 @@
 #include <limits>
 
 #include "arith/store_mode.h"
-#include "core/load.h"
 #include "core/status.h"
 #include "kernels/absdiff.h"
+#include "kernels/dispatch.h"
 
 namespace zelcv {
 namespace {
@@ -18,12 +18,9 @@ StoreMode storeMode(int bytesPerPixel, ZeliSize roi) {
 
 template <typename T>
 void run(StoreMode mode, Plane<const T> src1, Plane<const T> src2, T c, Plane<T> dst, int width, int height) {
-  if (useAvx512Kernels())
-    absdiff::run<T, avx512::Isa>(mode, src1, src2, c, dst, width, height);
-  else if (useAvx2Kernels())
-    absdiff::run<T, avx2::Isa>(mode, src1, src2, c, dst, width, height);
-  else
-    absdiff::run<T, simd::Sse2>(mode, src1, src2, c, dst, width, height);
+  withChosenIsa<IsaLevel::Avx512>([&](auto isa) {
+    absdiff::run<T, typename decltype(isa)::Isa>(mode, src1, src2, c, dst, width, height);
+  });
 }
 
 // |src1 - src2| over `channels` interleaved channels, run as one channel over

@@ -1,21 +1,19 @@
 // Add, AddSquare, AddProduct and AddWeighted: updates of a 32f accumulator
 // from 8u, 8s, 16u or 32f sources, plain or under a mask.
 #include "arith/store_mode.h"
-#include "core/load.h"
 #include "core/status.h"
 #include "kernels/accumulate.h"
+#include "kernels/dispatch.h"
 
 namespace zelcv {
 namespace {
 
 template <int kSources, bool kMasked, bool kInPlace, typename Src, typename Formula>
 void run(StoreMode mode, const accumulate::Images<Src>& images, ZeliSize roi, Formula f) {
-  if (useAvx512Kernels())
-    accumulate::run<kSources, kMasked, kInPlace, Src, Formula, avx512::Isa>(mode, images, roi.width, roi.height, f);
-  else if (useAvx2Kernels())
-    accumulate::run<kSources, kMasked, kInPlace, Src, Formula, avx2::Isa>(mode, images, roi.width, roi.height, f);
-  else
-    accumulate::run<kSources, kMasked, kInPlace, Src, Formula, simd::Sse2>(mode, images, roi.width, roi.height, f);
+  withChosenIsa<IsaLevel::Avx512>([&](auto isa) {
+    using Isa = typename decltype(isa)::Isa;
+    accumulate::run<kSources, kMasked, kInPlace, Src, Formula, Isa>(mode, images, roi.width, roi.height, f);
+  });
 }
 
 constexpr int kSinglePath = 0;  // no cache query, ordinary stores

@@ -2,8 +2,8 @@
 #include <algorithm>
 #include <type_traits>
 
-#include "core/load.h"
 #include "detect/integral_checks.h"
+#include "kernels/dispatch.h"
 #include "kernels/integral.h"
 
 namespace zelcv {
@@ -48,10 +48,9 @@ template <class Sum>
 ZelStatus plainIntegral(const Zel8u* src, int srcStep, typename Sum::T* dst, int dstStep,
                         ZeliSize roi, typename Sum::T val) {
   if (ZelStatus s = check8uIntegral(src, srcStep, dst, dstStep, roi, 1)) return s;
-  if (useAvx2Kernels())
-    integralImage<Sum, NoPlane, avx2::Isa>(src, srcStep, dst, dstStep, nullptr, 0, roi, val, 0);
-  else
-    integralImage<Sum, NoPlane, simd::Sse2>(src, srcStep, dst, dstStep, nullptr, 0, roi, val, 0);
+  withChosenIsa<IsaLevel::Avx2>([&](auto isa) {
+    integralImage<Sum, NoPlane, typename decltype(isa)::Isa>(src, srcStep, dst, dstStep, nullptr, 0, roi, val, 0);
+  });
   return zelStatusOk;
 }
 

@@ -20,16 +20,10 @@
 #include <type_traits>
 #include <utility>
 
-#include "core/load.h"
+#include "kernels/dispatch.h"
 #include "kernels/simd.h"
 
 namespace zelcv {
-namespace avx2 {
-struct Isa;
-}
-namespace avx512 {
-struct Isa;
-}
 namespace sep {
 
 // ---- sources -------------------------------------------------------------
@@ -757,13 +751,9 @@ ZELCV_SEP_WIDEST_SPANS(ZELCV_SEP_EXTERN_SPAN, avx512::Isa)
 // The span routine on the instruction set chosen at load.
 template <class P, class Src, class Taps>
 void filterSpanAnySize(const P& policy, const Src& src, typename P::Out* out, int n, const Taps& taps, int count) {
-  if constexpr (HasAvx512Form<P>::value) {
-    if (useAvx512Kernels()) return spanWith<avx512::Isa>(policy, src, out, n, taps, count);
-  }
-  if (useAvx2Kernels())
-    spanWith<avx2::Isa>(policy, src, out, n, taps, count);
-  else
-    spanWith<simd::Sse2>(policy, src, out, n, taps, count);
+  constexpr IsaLevel kWidest = HasAvx512Form<P>::value ? IsaLevel::Avx512 : IsaLevel::Avx2;
+  withChosenIsa<kWidest>(
+      [&](auto isa) { spanWith<typename decltype(isa)::Isa>(policy, src, out, n, taps, count); });
 }
 
 }  // namespace sep

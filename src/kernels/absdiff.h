@@ -11,12 +11,6 @@
 #include "kernels/simd.h"
 
 namespace zelcv {
-namespace avx2 {
-struct Isa;
-}
-namespace avx512 {
-struct Isa;
-}
 namespace absdiff {
 
 // The scalar form, and the vector form for any instruction set's vectors.

@@ -20,12 +20,6 @@
 #include "kernels/simd.h"
 
 namespace zelcv {
-namespace avx2 {
-struct Isa;
-}
-namespace avx512 {
-struct Isa;
-}
 namespace accumulate {
 
 // Single floats with the operations of a vector type.

@@ -15,9 +15,6 @@
 #include "kernels/simd.h"
 
 namespace zelcv {
-namespace avx2 {
-struct Isa;
-}
 namespace integral {
 
 // ---- Element conversions shared by both paths ------------------------------

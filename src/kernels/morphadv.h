@@ -9,9 +9,6 @@
 #include "kernels/simd.h"
 
 namespace zelcv {
-namespace avx2 {
-struct Isa;
-}
 namespace morphadv {
 
 // The scalar form and the vector form for any vector width `W`; `Isa` names

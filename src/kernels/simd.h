@@ -11,6 +11,16 @@
 #include <stdint.h>
 
 namespace zelcv {
+
+// The wider instruction sets' tags: defined in simd_avx2.h and simd_avx512.h,
+// which only the files compiled for them include.
+namespace avx2 {
+struct Isa;
+}
+namespace avx512 {
+struct Isa;
+}
+
 namespace simd {
 
 // The alignment granule of the row driver: heads run to a 16-byte boundary

@@ -8,9 +8,9 @@
 
 #include "core/alloc.h"
 #include "core/checks.h"
-#include "core/load.h"
 #include "core/status.h"
 #include "filter/border.h"
+#include "kernels/dispatch.h"
 #include "kernels/morphadv.h"
 #include "morph/morph_checks.h"
 #include "morph/morph_core.h"
@@ -162,10 +162,8 @@ struct Typed {
     const T* pa = reinterpret_cast<const T*>(a.base + int64_t(y) * a.step);
     const T* pb = reinterpret_cast<const T*>(b.base + int64_t(y) * b.step);
     T* po = reinterpret_cast<T*>(out.base + int64_t(y) * out.step);
-    if (useAvx2Kernels())
-      morphadv::differenceRow<T, avx2::Isa>(pa, pb, po, width * C);
-    else
-      morphadv::differenceRow<T, simd::Sse2>(pa, pb, po, width * C);
+    withChosenIsa<IsaLevel::Avx2>(
+        [&](auto isa) { morphadv::differenceRow<T, typename decltype(isa)::Isa>(pa, pb, po, width * C); });
   }
 };
 

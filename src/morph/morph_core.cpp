@@ -1,6 +1,6 @@
 #include "morph/morph_core.h"
 
-#include "core/load.h"
+#include "kernels/dispatch.h"
 #include "morph/morph_cores.h"
 
 namespace zelcv {
@@ -18,19 +18,18 @@ int bitAt(const uint8_t* row, int64_t position) {
 template <typename T>
 void rectFilter(bool max, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels, int rw,
                 int rh, int ox, int oy, uint8_t* work) {
-  if (useAvx2Kernels())
-    Cores<T, avx2::Isa>::rect(max, src, srcStep, dst, dstStep, roi, channels, rw, rh, ox, oy, work);
-  else
-    Cores<T, simd::Sse2>::rect(max, src, srcStep, dst, dstStep, roi, channels, rw, rh, ox, oy, work);
+  withChosenIsa<IsaLevel::Avx2>([&](auto isa) {
+    Cores<T, typename decltype(isa)::Isa>::rect(max, src, srcStep, dst, dstStep, roi, channels, rw, rh, ox, oy, work);
+  });
 }
 
 template <typename T>
 void apply(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int channels,
            ZeliBorderType border, const View& state, uint8_t* work, const RowSink& sink) {
-  if (useAvx2Kernels())
-    Cores<T, avx2::Isa>::apply(dilate, src, srcStep, dst, dstStep, roi, channels, border, state, work, sink);
-  else
-    Cores<T, simd::Sse2>::apply(dilate, src, srcStep, dst, dstStep, roi, channels, border, state, work, sink);
+  withChosenIsa<IsaLevel::Avx2>([&](auto isa) {
+    Cores<T, typename decltype(isa)::Isa>::apply(dilate, src, srcStep, dst, dstStep, roi, channels, border, state,
+                                                 work, sink);
+  });
 }
 
 #define ZELCV_MORPH_INSTANTIATE(T)                                                                  \

@@ -12,9 +12,6 @@
 #include "zelcv.h"
 
 namespace zelcv {
-namespace avx2 {
-struct Isa;
-}
 namespace morph {
 
 // Maximum (or minimum) over a solid rw x rh rectangle whose top-left element
