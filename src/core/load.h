@@ -20,6 +20,8 @@ int onLibraryLoad(void* module, uint32_t reason, void* reserved);
 // Informational: no operation consults it.
 int cpuFeatureFlag();
 
+// The two choices below are read through withChosenIsa (kernels/dispatch.h).
+//
 // Whether the AVX2 kernels run instead of the SSE2 ones: chosen at load, when
 // the processor and the operating system support AVX2 and FMA. Both give the same
 // results bit for bit; before the load routine runs, the SSE2 kernels do.

@@ -3,10 +3,12 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <type_traits>
 
 #include "core/alloc.h"
 #include "core/checks.h"
 #include "core/load.h"
+#include "kernels/dispatch.h"
 #include "support/fault_injection.h"
 #include "zelcore.h"
 
@@ -103,6 +105,16 @@ TEST(Allocation, AlignUpPlacesInsideTheBlock) {
 
 namespace {
 
+// 0, 1 or 2 for the SSE2, AVX2 or AVX-512 kernels that a family with kernels
+// up to kWidest runs.
+template <zelcv::IsaLevel kWidest>
+int chosenLevel() {
+  return zelcv::withChosenIsa<kWidest>([](auto isa) {
+    using Isa = typename decltype(isa)::Isa;
+    return std::is_same<Isa, zelcv::avx512::Isa>::value ? 2 : std::is_same<Isa, zelcv::avx2::Isa>::value ? 1 : 0;
+  });
+}
+
 TEST(LoadRoutine, ActsOnProcessAttachOnlyAndAlwaysSucceeds) {
   struct Case {
     uint32_t mask;
@@ -122,6 +134,10 @@ TEST(LoadRoutine, ActsOnProcessAttachOnlyAndAlwaysSucceeds) {
     EXPECT_EQ(zelcv::cpuFeatureFlag(), c.flag) << std::hex << c.mask;
     EXPECT_EQ(zelcv::useAvx2Kernels(), c.avx2) << std::hex << c.mask;
     EXPECT_EQ(zelcv::useAvx512Kernels(), c.avx512) << std::hex << c.mask;
+    // A family gets the widest of its own kernels that the choice allows.
+    EXPECT_EQ(chosenLevel<zelcv::IsaLevel::Avx512>(), c.avx512 ? 2 : c.avx2 ? 1 : 0) << std::hex << c.mask;
+    EXPECT_EQ(chosenLevel<zelcv::IsaLevel::Avx2>(), c.avx2 ? 1 : 0) << std::hex << c.mask;
+    EXPECT_EQ(chosenLevel<zelcv::IsaLevel::Sse2>(), 0);
     // Every other reason leaves the choices and makes no query.
     faults.setCpuFeatures(~c.mask);
     for (uint32_t reason : {0u, 2u, 3u, 4u, 99u}) {
