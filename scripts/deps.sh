@@ -1,12 +1,13 @@
 #!/usr/bin/env bash
 # Installs the Debian packages that zelcv's build needs, when they are missing.
 #   scripts/deps.sh          what building and testing need
-#   scripts/deps.sh --bench  also Google Benchmark and OpenCV for bench/
+#   scripts/deps.sh --bench  also Google Benchmark for bench/
 set -euo pipefail
 
-packages=(build-essential cmake g++-multilib libgtest-dev pkg-config)
+# OpenCV is a test dependency: the conformity tests compare results with it.
+packages=(build-essential cmake g++-multilib libgtest-dev libopencv-dev pkg-config)
 if [[ "${1:-}" == "--bench" ]]; then
-  packages+=(libbenchmark-dev libopencv-dev)
+  packages+=(libbenchmark-dev)
 fi
 
 missing=()
