@@ -7,6 +7,10 @@ cd "$(dirname "$0")/.."
 scripts/deps.sh
 
 jobs=$(nproc)
+# ccache, where the machine has it, shares objects between configurations
+# and work trees; results do not depend on it.
+launcher=()
+command -v ccache > /dev/null && launcher=(-DCMAKE_C_COMPILER_LAUNCHER=ccache -DCMAKE_CXX_COMPILER_LAUNCHER=ccache)
 configs=("$@")
 [[ ${#configs[@]} -eq 0 ]] && configs=(release x86 sanitize)
 
@@ -19,7 +23,7 @@ for config in "${configs[@]}"; do
     *) echo "unknown configuration: $config" >&2; exit 2 ;;
   esac
   echo "=== $config"
-  cmake -S . -B "build/test-$config" "${flags[@]}" > "build-$config.log" 2>&1 || { cat "build-$config.log"; exit 1; }
+  cmake -S . -B "build/test-$config" "${flags[@]}" "${launcher[@]}" > "build-$config.log" 2>&1 || { cat "build-$config.log"; exit 1; }
   rm -f "build-$config.log"
   cmake --build "build/test-$config" -j"$jobs"
   ctest --test-dir "build/test-$config" -j"$jobs" --output-on-failure
