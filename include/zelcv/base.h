@@ -110,6 +110,14 @@ enum {
   zelBorderInMemRight = 0x80
 };
 
+/* ---- Shared selectors ------------------------------------------------- */
+/* Several families take these: derivative kernels (Canny, the derivative
+ * filters), fixed mask sizes, and norms (|x| max, sum of |x|, root of the sum
+ * of squares). */
+enum { zelFilterSobel = 2, zelFilterScharr = 5 };
+enum { zelMaskSize3x3 = 33, zelMaskSize5x5 = 55 };
+enum { zelNormInf = 1, zelNormL1 = 2, zelNormL2 = 4 };
+
 /* ---- Version ----------------------------------------------------------- */
 typedef struct {
   int32_t major;

@@ -17,9 +17,8 @@ extern "C" {
  * Thresholds: 0 <= low <= high, else zelStatusBadArgument (also for NaN).
  * A size whose work buffer would exceed INT_MAX bytes gives zelStatusBadSize
  * from the queries and the operations alike. */
-enum { zelFilterSobel = 2, zelFilterScharr = 5 };    /* derivative kernel kinds */
-enum { zelMaskSize3x3 = 33, zelMaskSize5x5 = 55 };
-enum { zelNormL1 = 2, zelNormL2 = 4 };                /* |dx| + |dy|; sqrt(dx^2 + dy^2) */
+/* The selectors zelFilterSobel/zelFilterScharr, zelMaskSize3x3/5x5 and
+ * zelNormL1/L2 are in zelcv/base.h. */
 
 /* Work buffer bytes for zeliCanny_16s8u_C1R and zeliCanny_32f8u_C1R. */
 ZELCV_API ZelStatus ZELCV_CALL zeliCannyGetSize(ZeliSize roiSize, int* bufferSize);
