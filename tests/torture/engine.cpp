@@ -420,7 +420,8 @@ struct ImageMemory {
 
 Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, int failAllocationsFrom) {
   Outcome out;
-  zeltest::FaultInjection fi;
+  std::unique_ptr<zeltest::FaultInjection> injection;
+  if (v.countAllocations) injection = std::make_unique<zeltest::FaultInjection>();
   RunArena arena(v.odd);
   std::mt19937 rng(12345);
   const int w = v.roi.width, h = v.roi.height;
@@ -564,12 +565,18 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
     return snap;
   };
   std::vector<std::vector<uint8_t>> before = snapshot(true), beforeImages = snapshot(false);
-  const int allocationsBefore = fi.allocations();
-  if (failAllocationsFrom >= 0) fi.failAllocationsFrom(allocationsBefore + failAllocationsFrom);
-  out.faulted = callCatching(e, frame, v.catchFaults, out.status);
-  if (out.faulted) out.status = kFaulted;
-  fi.failAllocationsFrom(-1);
-  out.allocations = fi.allocations() - allocationsBefore;
+  const int allocationsBefore = injection ? injection->allocations() : 0;
+  if (injection && failAllocationsFrom >= 0) injection->failAllocationsFrom(allocationsBefore + failAllocationsFrom);
+  if (v.countAllocations) {
+    out.faulted = callCatching(e, frame, v.catchFaults, out.status);
+    if (out.faulted) out.status = kFaulted;
+  } else {
+    out.status = e.call(frame);
+  }
+  if (injection) {
+    injection->failAllocationsFrom(-1);
+    out.allocations = injection->allocations() - allocationsBefore;
+  }
   out.untouched = snapshot(true) == before;
   out.imagesUntouched = snapshot(false) == beforeImages;
 
@@ -595,7 +602,7 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
     }
   }
   if (!arena.guardsIntact()) out.guardsIntact = false;
-  out.liveBlocks = fi.liveBlocks();
+  out.liveBlocks = injection ? injection->liveBlocks() : 0;
   return out;
 }
 

@@ -87,6 +87,7 @@ struct Variant {
   int border = 0;               // which border alternative
   std::vector<Mutation> mutations;
   bool catchFaults = false;     // a fault inside the call returns (rows against a page)
+  bool countAllocations = true; // false: no fault injection, so that threads may run calls at once
 };
 
 constexpr ZelStatus kFaulted = -100000;
