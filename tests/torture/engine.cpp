@@ -1,9 +1,10 @@
 #include "torture/engine.h"
 
+#if !defined(_WIN32)
 #include <setjmp.h>
 #include <signal.h>
-#include <sys/mman.h>
 #include <unistd.h>
+#endif
 
 #include <algorithm>
 #include <cstdlib>
@@ -13,6 +14,7 @@
 #include <sstream>
 
 #include "support/fault_injection.h"
+#include "support/guard_page.h"
 
 namespace zeltorture {
 
@@ -52,7 +54,7 @@ class Memory {
       data_ = reinterpret_cast<uint8_t*>(base) + offset;
       return;
     }
-    page_ = std::size_t(sysconf(_SC_PAGESIZE));
+    page_ = zeltest::pageSize();
     std::size_t pages = (bytes_ + page_ - 1) / page_;
     mapped_ = (pages + 1) * page_;
     map_ = takeMapping(pages, placement);
@@ -65,7 +67,7 @@ class Memory {
     }
   }
   ~Memory() {
-    if (map_) pool().push_back({map_, mapped_ / page_ - 1, placement_});
+    if (mapping_) pool().push_back({std::move(mapping_), mapped_ / page_ - 1, placement_});
   }
   Memory(const Memory&) = delete;
   Memory& operator=(const Memory&) = delete;
@@ -76,8 +78,8 @@ class Memory {
   // Mappings with their inaccessible page, kept for reuse: making one per
   // call would cost more than the calls themselves.
   struct Mapping {
-    uint8_t* base;
-    std::size_t pages;
+    std::unique_ptr<zeltest::GuardedPages> pages;
+    std::size_t count;
     Placement placement;
   };
   static std::vector<Mapping>& pool() {
@@ -87,16 +89,14 @@ class Memory {
   uint8_t* takeMapping(std::size_t pages, Placement placement) {
     auto& p = pool();
     for (std::size_t i = 0; i < p.size(); ++i)
-      if (p[i].pages == pages && p[i].placement == placement) {
-        uint8_t* base = p[i].base;
+      if (p[i].count == pages && p[i].placement == placement) {
+        mapping_ = std::move(p[i].pages);
         p.erase(p.begin() + long(i));
-        return base;
+        return mapping_->base();
       }
-    void* m = mmap(nullptr, mapped_, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
-    if (m == MAP_FAILED) std::abort();
-    uint8_t* base = static_cast<uint8_t*>(m);
-    mprotect(placement == Placement::PageEnd ? base + pages * page_ : base, page_, PROT_NONE);
-    return base;
+    mapping_ = std::make_unique<zeltest::GuardedPages>(pages + 1);
+    if (!mapping_->ok() || !mapping_->protect(placement == Placement::PageEnd ? pages : 0)) std::abort();
+    return mapping_->base();
   }
 
   bool guardsIntact() const {
@@ -123,6 +123,7 @@ class Memory {
   Placement placement_;
   std::size_t bytes_;
   std::vector<uint8_t> storage_;
+  std::unique_ptr<zeltest::GuardedPages> mapping_;
   uint8_t* map_ = nullptr;
   std::size_t mapped_ = 0;
   std::size_t page_ = 0;
@@ -183,6 +184,7 @@ void fillPixels(uint8_t* p, std::size_t bytes, const Spec& s, std::mt19937& rng)
   }
 }
 
+#if !defined(_WIN32)
 sigjmp_buf* gFaultJump = nullptr;
 char gCurrentCall[256];
 
@@ -228,6 +230,13 @@ bool callCatching(const Entry& e, const Frame& frame, bool catchFaults, ZelStatu
   sigaction(SIGBUS, &oldBus, nullptr);
   return faulted;
 }
+#else
+// No recovery from a fault here: it ends the test process.
+bool callCatching(const Entry& e, const Frame& frame, bool, ZelStatus& status) {
+  status = e.call(frame);
+  return false;
+}
+#endif
 
 }  // namespace
 
