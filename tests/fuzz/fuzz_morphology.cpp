@@ -116,7 +116,7 @@ void checkAgainstReference(Input& in, std::vector<uint8_t>& mask, int mw, int mh
   in.fill(src.data(), src.size());
   int stateSize = 0, bufferSize = 0;
   if (zeliMorphologyBorderGetSize_8u_C1R(w, {mw, mh}, &stateSize, &bufferSize) != zelStatusOk) return;
-  std::vector<uint8_t> state(size_t(stateSize)), buffer(size_t(bufferSize));
+  std::vector<uint8_t> state(static_cast<size_t>(stateSize)), buffer(static_cast<size_t>(bufferSize));
   auto* st = reinterpret_cast<ZeliMorphState*>(state.data());
   if (zeliMorphologyBorderInit_8u_C1R(w, mask.data(), {mw, mh}, st, nullptr) != zelStatusOk) abort();
   for (bool dilate : {true, false}) {
