@@ -387,6 +387,8 @@ std::string parseRoles(const Entry& e, std::vector<Spec>& specs) {
       if (s.role == Role::Rows && first.depth != 2) return fail("rows need a pointer to row pointers");
     }
     if (s.role == Role::New && first.depth != 2) return fail("new= takes a pointer to the object pointer");
+    if (s.role == Role::Result && (first.elemSize != 4 || first.floating || first.depth != 1))
+      return fail("res takes an int*; use blk for other results");
     for (int k = 1; k < n; ++k)
       if (e.params[size_t(param + k)].kind != 'i') return fail("step and bit offset must be integers");
     param += n;
