@@ -34,7 +34,7 @@ TORTURE_MAKER(morphadv,
               },
               [](void* p) { zeliMorphAdvFree(static_cast<ZeliMorphAdvState*>(p)); });
 
-#define BORDERS "border=1,6,0x31,0x32,0xF1"
+#define BORDERS "border=1,6,0x31,0x11,0x21,0xF1"
 #define OPS(t, images, value)                                                                      \
   TORTURE(zeliMorphAdvGetSize_##t, "roi sz=3x3 res res"),                                          \
   TORTURE(zeliMorphAdvInit_##t, "roi arr=9,1 sz=3x3 blk blk"),                                     \
