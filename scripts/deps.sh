@@ -5,7 +5,8 @@
 set -euo pipefail
 
 # OpenCV is a test dependency: the conformity tests compare results with it.
-packages=(build-essential cmake g++-multilib libgtest-dev libopencv-dev pkg-config)
+# clang and its runtime build the fuzz targets (libFuzzer) of the sanitizer run.
+packages=(build-essential clang cmake g++-multilib libclang-rt-dev libgtest-dev libopencv-dev pkg-config)
 if [[ "${1:-}" == "--bench" ]]; then
   packages+=(libbenchmark-dev)
 fi

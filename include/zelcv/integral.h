@@ -18,6 +18,14 @@ extern "C" {
  * source row (a 32-bit unsigned integer for 8u sources, converted once to the
  * output's floating type; single precision for 32f sources) added to the row
  * above. 32s outputs wrap modulo 2^32; they are never saturated.
+ * Limits of the running sums: the plain row sum wraps modulo 2^32 once a
+ * row's pixels add up to 2^32 or more (rows of more than 16843009 pixels of
+ * 255). The running sum of squares is a 32-bit unsigned integer too, also in
+ * the members with double-precision squares (8u32s64f, 8u32f64f), which
+ * convert it once per pixel: a row whose squares add up to 2^32 or more
+ * (more than 66051 pixels of 255) wraps modulo 2^32 before the conversion;
+ * for example a 70000 x 2 ROI of 255 ends its squares plane with 513565408,
+ * not 9103500000. Split wider rows into strips.
  * Checks: null src, dst (or sqr) -8; w or h < 1 -6; srcStep < w x source
  * element size, dstStep (sqrStep) < (w + 1) x output element size -14; a
  * step of a 32- or 64-bit image not a multiple of its element size -108

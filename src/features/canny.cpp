@@ -6,6 +6,7 @@
 #include <cstring>
 
 #include "core/alloc.h"
+#include "core/sizes.h"
 #include "core/status.h"
 #include "features/canny_kernels.h"
 #include "filter/border.h"
@@ -21,17 +22,18 @@ constexpr int kSmallSide = 65533;  // both sides below: 16-bit stack coordinates
 
 bool smallImage(ZeliSize roi) { return roi.width < kSmallSide && roi.height < kSmallSide; }
 
+// Saturating: products of two sides near INT_MAX exceed 64 bits.
 int64_t derivativeInputBufferBytes(ZeliSize roi) {
-  const int64_t w = roi.width, h = roi.height;
-  const int64_t perRow = smallImage(roi) ? 5 : 9;
-  return (perRow * h + 2 * perRow) * (w + 2) + 16 * w + 160;
+  const SizeCalc w = roi.width, h = roi.height;
+  const SizeCalc perRow = smallImage(roi) ? 5 : 9;
+  return ((perRow * h + 2 * perRow) * (w + 2) + 16 * w + 160).value();
 }
 
 int borderMargin(int mask) { return mask == zelMaskSize5x5 ? 4 : 2; }
 
 int64_t imageInputBufferBytes(ZeliSize roi, int mask) {
-  const int64_t k = borderMargin(mask);
-  return (5 * (roi.height + k) + 16) * (roi.width + k) + 64;
+  const SizeCalc k = borderMargin(mask);
+  return ((5 * (roi.height + k) + 16) * (roi.width + k) + 64).value();
 }
 
 // NaN thresholds are refused along with the documented cases.

@@ -417,9 +417,26 @@ struct FloatDataSum {
     ((a = L::addProduct(a, taps.vec(K), window<S, J, K>(c))), ...);
     return a;
   }
+  // Vector M of the widened elements. The four output vectors need the
+  // elements up to kNeeded - 1 only; where the last vector would reach past
+  // them, it is loaded to end at the last needed element and moved into
+  // place, so that a block never reads beyond the row's reach (the row may
+  // end at an inaccessible page). Its lanes past the needed ones are never
+  // used by a window.
+  template <int kNeeded, int M>
+  static V widened(const float* p) {
+    constexpr int over = (M + 1) * L::kCount - kNeeded;
+    if constexpr (over <= 0) {
+      return L::load(p + M * L::kCount);
+    } else {
+      const V tail = L::load(p + kNeeded - L::kCount);
+      return L::template shift<over>(tail, tail);
+    }
+  }
   template <int N, int S, class Taps, int... M>
   static void slidingBlock(const float* p, float* out, const Taps& taps, std::integer_sequence<int, M...>) {
-    const V c[] = {L::load(p + M * L::kCount)...};
+    constexpr int kNeeded = 4 * L::kCount + (N - 1) * S;
+    const V c[] = {widened<kNeeded, M>(p)...};
     using TapIndices = std::make_integer_sequence<int, N>;
     L::store(out, slidingSum<S, 0>(c, taps, TapIndices{}), slidingSum<S, 1>(c, taps, TapIndices{}));
     L::store(out + 2 * L::kCount, slidingSum<S, 2>(c, taps, TapIndices{}), slidingSum<S, 3>(c, taps, TapIndices{}));

@@ -38,6 +38,10 @@ struct MinOp {
   static typename W::Raw v(typename W::Raw a, typename W::Raw b) { return W::min(a, b); }
 };
 
+// Scalar accesses to rows go through these: 32f rows may be misaligned.
+template <typename T> inline T ld(const T* p) { return simd::loadOne(p); }
+template <typename T> inline void st(T* p, T v) { simd::storeOne(p, v); }
+
 template <typename W>
 struct Width {
   using type = W;
@@ -113,9 +117,9 @@ void combineRowsFixed(T* out, const T* const* rows, int n) {
     return m;
   });
   for (; i < n; ++i) {
-    T m = r[0][i];
-    for (int k = 1; k < N; ++k) m = Op::s(m, r[k][i]);
-    out[i] = m;
+    T m = ld(r[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::s(m, ld(r[k] + i));
+    st(out + i, m);
   }
 }
 
@@ -154,10 +158,10 @@ void combinePair(T* out0, T* out1, const T* const* common, const T* first, const
     W::storeu(out1 + i, Op::template v<W>(m, W::loadu(last + i)));
   });
   for (; i < n; ++i) {
-    T m = common[0][i];
-    for (int k = 1; k < N; ++k) m = Op::s(m, common[k][i]);
-    out0[i] = Op::s(m, first[i]);
-    out1[i] = Op::s(m, last[i]);
+    T m = ld(common[0] + i);
+    for (int k = 1; k < N; ++k) m = Op::s(m, ld(common[k] + i));
+    st(out0 + i, Op::s(m, ld(first + i)));
+    st(out1 + i, Op::s(m, ld(last + i)));
   }
 }
 
@@ -192,19 +196,20 @@ void combineQuad(T* const* out, const T* const* common, const T* const* a, const
     }
   });
   for (; i < n; ++i) {
-    const T a2 = a[2][i], a1 = Op::s(a[1][i], a2), a0 = Op::s(a[0][i], a1);
-    const T b0 = b[0][i], b1 = Op::s(b0, b[1][i]), b2 = Op::s(b1, b[2][i]);
+    const T a2 = ld(a[2] + i), a1 = Op::s(ld(a[1] + i), a2), a0 = Op::s(ld(a[0] + i), a1);
+    const T b0 = ld(b[0] + i), b1 = Op::s(b0, ld(b[1] + i)), b2 = Op::s(b1, ld(b[2] + i));
     T m0 = a0, m1 = Op::s(a1, b0), m2 = Op::s(a2, b1), m3 = b2;
     for (int k = 0; k < N; ++k) {
-      m0 = Op::s(common[k][i], m0);
-      m1 = Op::s(common[k][i], m1);
-      m2 = Op::s(common[k][i], m2);
-      m3 = Op::s(common[k][i], m3);
+      const T c = ld(common[k] + i);
+      m0 = Op::s(c, m0);
+      m1 = Op::s(c, m1);
+      m2 = Op::s(c, m2);
+      m3 = Op::s(c, m3);
     }
-    out[0][i] = m0;
-    out[1][i] = m1;
-    out[2][i] = m2;
-    out[3][i] = m3;
+    st(out[0] + i, m0);
+    st(out[1] + i, m1);
+    st(out[2] + i, m2);
+    st(out[3] + i, m3);
   }
 }
 
@@ -226,9 +231,9 @@ void vanHerkStep(T* out, T* prefixOut, const T* prefixIn, const T* h, const T* s
     W::storeu(out + i, Op::template v<W>(W::loadu(suffix + i), p));
   });
   for (; i < n; ++i) {
-    T p = prefixIn ? Op::s(prefixIn[i], h[i]) : h[i];
-    prefixOut[i] = p;
-    out[i] = Op::s(suffix[i], p);
+    T p = prefixIn ? Op::s(ld(prefixIn + i), ld(h + i)) : ld(h + i);
+    st(prefixOut + i, p);
+    st(out + i, Op::s(ld(suffix + i), p));
   }
 }
 
@@ -241,7 +246,7 @@ void combineForward(T* out, const T* a, const T* b, int n) {
     using W = typename decltype(w)::type;
     return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
-  for (; i < n; ++i) out[i] = Op::s(a[i], b[i]);
+  for (; i < n; ++i) st(out + i, Op::s(ld(a + i), ld(b + i)));
 }
 
 // out[i] = op over src[i + offsets[k]], k < N, for i < n elements; in
@@ -257,9 +262,9 @@ void windowOffsetsFixed(const T* src, T* out, int n, const int* offsets) {
     return m;
   });
   for (; i < n; ++i) {
-    T m = src[i + o[0]];
-    for (int k = 1; k < N; ++k) m = Op::s(m, src[i + o[k]]);
-    out[i] = m;
+    T m = ld(src + i + o[0]);
+    for (int k = 1; k < N; ++k) m = Op::s(m, ld(src + i + o[k]));
+    st(out + i, m);
   }
 }
 
@@ -282,7 +287,7 @@ void combineBackward(T* out, const T* a, const T* b, int n) {
     using W = typename decltype(w)::type;
     return Op::template v<W>(W::loadu(a + i), W::loadu(b + i));
   });
-  for (int i = n - vectors; i > 0; --i) out[i - 1] = Op::s(a[i - 1], b[i - 1]);
+  for (int i = n - vectors; i > 0; --i) st(out + i - 1, Op::s(ld(a + i - 1), ld(b + i - 1)));
 }
 
 struct WindowOffsets {
@@ -315,14 +320,14 @@ void windowEnds(const T* R, int lenR, int c, T* out, int rowLen, int e0, int e1,
   V::storeu(head + M, V::loadu(R));
   V::storeu(tail, V::loadu(R + lenR - L));
   if (c == 1) {  // the margins in two vectors each
-    V::storeu(head, V::set1(R[0]));
-    V::storeu(head + M - L, V::set1(R[0]));
-    V::storeu(tail + L, V::set1(R[lenR - 1]));
-    V::storeu(tail + M, V::set1(R[lenR - 1]));
+    V::storeu(head, V::set1(ld(R)));
+    V::storeu(head + M - L, V::set1(ld(R)));
+    V::storeu(tail + L, V::set1(ld(R + lenR - 1)));
+    V::storeu(tail + M, V::set1(ld(R + lenR - 1)));
   } else {
     for (int i = 0, ch = 0; i < M; ++i, ch = ch + 1 < c ? ch + 1 : 0) {
-      head[i] = R[ch];
-      tail[L + i] = R[lenR - c + ch];
+      head[i] = ld(R + ch);
+      tail[L + i] = ld(R + lenR - c + ch);
     }
   }
   auto vectorAt = [&](int j) {
@@ -427,20 +432,20 @@ void windowRow(const T* src, T* out, int width, int channels, int s, int K, T* t
   // Running prefix and suffix extremes for the rest.
   for (int ch = 0; ch < c; ++ch) {
     int upTo = 0;
-    T run = src[ch];
+    T run = ld(src + ch);
     for (int x = 0; x < xs; ++x) {
       int b = x + s + K - 1;
       if (b > width - 1) b = width - 1;
-      for (; upTo < b; ++upTo) run = Op::s(run, src[(upTo + 1) * c + ch]);
-      out[x * c + ch] = run;
+      for (; upTo < b; ++upTo) run = Op::s(run, ld(src + (upTo + 1) * c + ch));
+      st(out + x * c + ch, run);
     }
     int from = width - 1;
-    run = src[from * c + ch];
+    run = ld(src + from * c + ch);
     for (int x = width - 1; x >= xe; --x) {
       int a = x + s;
       if (a < 0) a = 0;
-      for (; from > a; --from) run = Op::s(run, src[(from - 1) * c + ch]);
-      out[x * c + ch] = run;
+      for (; from > a; --from) run = Op::s(run, ld(src + (from - 1) * c + ch));
+      st(out + x * c + ch, run);
     }
   }
 }
@@ -455,7 +460,8 @@ void windowFromTwo(const T* in, T* out, int width, int c, int a, int b) {
   auto clamp = [&](int i) { return i < 0 ? 0 : (i >= width ? width - 1 : i); };
   auto edge = [&](int from, int to) {
     for (int x = from; x < to; ++x)
-      for (int ch = 0; ch < c; ++ch) out[x * c + ch] = Op::s(in[clamp(x + a) * c + ch], in[clamp(x + b) * c + ch]);
+      for (int ch = 0; ch < c; ++ch)
+        st(out + x * c + ch, Op::s(ld(in + clamp(x + a) * c + ch), ld(in + clamp(x + b) * c + ch)));
   };
   edge(0, x0);
   edge(x1, width);
@@ -477,7 +483,8 @@ void combineShifted(T* acc, int width, int c, const T* roi, const T* mem, bool m
   };
   auto edge = [&](int x0, int x1, const T* pixel) {
     for (int x = x0; x < x1; ++x)
-      for (int ch = 0; ch < c; ++ch) acc[x * c + ch] = First ? pixel[ch] : Op::s(acc[x * c + ch], pixel[ch]);
+      for (int ch = 0; ch < c; ++ch)
+        st(acc + x * c + ch, First ? ld(pixel + ch) : Op::s(ld(acc + x * c + ch), ld(pixel + ch)));
   };
   const int leftEnd = shift < 0 ? (-shift < width ? -shift : width) : 0;
   const int rightStart = width - shift < leftEnd ? leftEnd : (width - shift < width ? width - shift : width);

@@ -52,7 +52,8 @@ void differenceRow(const T* a, const T* b, T* out, int n) {
   }
   for (; i + P::kLanes <= n; i += P::kLanes)
     P::storeu(out + i, Difference<T, Isa>::template v<P>(P::loadu(a + i), P::loadu(b + i)));
-  for (; i < n; ++i) out[i] = Difference<T, Isa>::s(a[i], b[i]);
+  // Rows of 32f images may be misaligned for their elements.
+  for (; i < n; ++i) simd::storeOne(out + i, Difference<T, Isa>::s(simd::loadOne(a + i), simd::loadOne(b + i)));
 }
 
 // Built in morph_core_avx2.cpp.

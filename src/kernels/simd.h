@@ -9,6 +9,7 @@
 #include <emmintrin.h>
 #include <stddef.h>
 #include <stdint.h>
+#include <string.h>
 
 namespace zelcv {
 
@@ -22,6 +23,21 @@ struct Isa;
 }
 
 namespace simd {
+
+// One element at an address that may be misaligned for T (rows of 32f
+// images whose steps are not multiples of 4): every scalar access to a
+// caller's row that may be so goes through these, which compile to one
+// plain move.
+template <typename T>
+inline T loadOne(const T* p) {
+  T v;
+  memcpy(&v, p, sizeof v);
+  return v;
+}
+template <typename T>
+inline void storeOne(T* p, T v) {
+  memcpy(p, &v, sizeof v);
+}
 
 // The alignment granule of the row driver: heads run to a 16-byte boundary
 // whatever the vector width.

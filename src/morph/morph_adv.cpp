@@ -2,12 +2,15 @@
 // compositions of the flat dilation/erosion cores with an intermediate image
 // in the caller's buffer, followed where needed by a per-pixel difference.
 #include <limits.h>
+#include <stddef.h>
+#include <stdint.h>
 #include <string.h>
 
 #include <algorithm>
 
 #include "core/alloc.h"
 #include "core/checks.h"
+#include "core/sizes.h"
 #include "core/status.h"
 #include "filter/border.h"
 #include "kernels/dispatch.h"
@@ -50,12 +53,13 @@ template <> constexpr int typeCode<Zel32f>() { return zel32f; }
 struct Sizes {
   int64_t subState, work, capacity;
 };
+// Saturating arithmetic: the sizes may be anything up to INT_MAX here.
 Sizes sizesFor(int dataType, int channels, bool bits, ZeliSize roi, ZeliSize mask) {
-  const int64_t rowBytes =
-      alignSize((int64_t(roi.width) + mask.width - 1) * channels * elementSize(dataType), 32);
+  const SizeCalc rowBytes =
+      alignSize((SizeCalc(roi.width) + mask.width - 1) * channels * elementSize(dataType), 32);
   return {borderStateSize(dataType, channels, roi.width, mask, bits),
           commonBufferSize(dataType, channels, roi.width, mask),
-          rowBytes * (int64_t(roi.height) + mask.height - 1)};
+          (rowBytes * (SizeCalc(roi.height) + mask.height - 1)).value()};
 }
 bool badSizes(ZeliSize roi, ZeliSize mask) {
   return roi.width < 1 || roi.height < 1 || mask.width < 1 || mask.height < 1;
@@ -71,6 +75,15 @@ ZelStatus advGetSize(int dataType, int channels, bool bits, ZeliSize roi, ZeliSi
   *stateSize = int(state);
   *bufferSize = int(buffer);
   return zelStatusOk;
+}
+
+// Where the intermediate image starts in a buffer: after the two working
+// areas, moved back to its element alignment (the buffer may start at any
+// address; the working areas align their own parts and leave more than
+// those few bytes unused at their end).
+uint8_t* imageStart(uint8_t* buffer, int64_t workBytes, int elementBytes) {
+  const uintptr_t at = reinterpret_cast<uintptr_t>(buffer + 2 * workBytes);
+  return buffer + 2 * workBytes - ptrdiff_t(at & uintptr_t(elementBytes - 1));
 }
 
 void reflect(Zel8u* mask, ZeliSize size) { std::reverse(mask, mask + int64_t(size.width) * size.height); }
@@ -101,8 +114,9 @@ ZelStatus advInit(int dataType, int channels, bool bits, ZeliSize roi, Zel8u* ma
   const Sizes z = sizesFor(dataType, channels, bits, roi, maskSize);
   if (2 * z.subState + kAdvHeaderBytes > INT_MAX || z.capacity + 2 * z.work > INT_MAX) return zelStatusBadSize;
   uint8_t* block = reinterpret_cast<uint8_t*>(state);
-  AdvHeader h = {block + kAdvHeaderBytes, block + kAdvHeaderBytes + z.subState, buffer + 2 * z.work,
-                 int32_t(z.capacity), int32_t(z.work)};
+  AdvHeader h = {block + kAdvHeaderBytes, block + kAdvHeaderBytes + z.subState,
+                 imageStart(buffer, z.work, elementSize(bits ? zel8u : dataType)), int32_t(z.capacity),
+                 int32_t(z.work)};
   const ZeliPoint centre = {(maskSize.width - 1) / 2, (maskSize.height - 1) / 2};
   if (ZelStatus s = buildPair(kModeInit, dataType, channels, bits, roi, mask, maskSize, centre, &h.first,
                               &h.second))
@@ -148,10 +162,11 @@ struct Plane {
 // row step of an intermediate image and the difference.
 template <typename T, int C>
 struct Typed {
+  static constexpr int kElementBytes = int(sizeof(T));
   static Plane shifted(Plane p, int dx, int dy) {
     return {p.base + int64_t(dy) * p.step + int64_t(dx) * C * int64_t(sizeof(T)), p.step, 0};
   }
-  static int64_t rowBytes(int width) { return alignSize(int64_t(width) * C * int64_t(sizeof(T)), 32); }
+  static int64_t rowBytes(int64_t width) { return alignSize(width * C * int64_t(sizeof(T)), 32); }
   static View view(const void* state) { return readState(state); }
   static void pass(bool dilate, Plane s, Plane d, ZeliSize roi, ZeliBorderType border, const View& v,
                    uint8_t* work, int64_t, const RowSink& sink) {
@@ -168,12 +183,13 @@ struct Typed {
 };
 
 struct Bits {
+  static constexpr int kElementBytes = 1;
   static Plane shifted(Plane p, int dx, int dy) {
     const int bit = p.bitOffset + dx;
     const int bytes = bit >= 0 ? bit / 8 : -((7 - bit) / 8);  // floor division
     return {p.base + int64_t(dy) * p.step + bytes, p.step, bit - 8 * bytes};
   }
-  static int64_t rowBytes(int width) { return alignSize((int64_t(width) + 7) / 8, 32); }
+  static int64_t rowBytes(int64_t width) { return alignSize((width + 7) / 8, 32); }
   static View view(const void* state) { return readBitState(state); }
   // The 1-bit core keeps a ring of maskHeight + 1 unpacked rows of the
   // extended width; when the working memory is short of that, the ROI is
@@ -241,13 +257,16 @@ ZelStatus openClose(bool closing, Plane src, Plane dst, ZeliSize roi, ZeliBorder
   const int right = (flags & zelBorderInMemRight) ? v2.maskWidth - 1 - v2.anchorX : 0;
   const int top = (flags & zelBorderInMemTop) ? v2.anchorY : 0;
   const int bottom = (flags & zelBorderInMemBottom) ? v2.maskHeight - 1 - v2.anchorY : 0;
-  const ZeliSize wide = {roi.width + left + right, roi.height + top + bottom};
-  const int64_t step = F::rowBytes(wide.width);
-  if (step * wide.height > h.capacity) return zelStatusBadSize;
+  // The widened size in 64 bits: the ROI may reach INT_MAX, and only the
+  // capacity test below tells whether the widened image fits.
+  const int64_t wideWidth = int64_t(roi.width) + left + right, wideHeight = int64_t(roi.height) + top + bottom;
+  const int64_t step = F::rowBytes(wideWidth);
+  if ((SizeCalc(step) * wideHeight).value() > h.capacity) return zelStatusBadSize;
+  const ZeliSize wide = {int(wideWidth), int(wideHeight)};
   // The two sub-operations run one after the other, so each may use both
   // working areas.
   const int64_t work = 2 * int64_t(h.workBytes);
-  const Plane image = {buffer + work, int(step), 0};
+  const Plane image = {imageStart(buffer, h.workBytes, F::kElementBytes), int(step), 0};
   F::pass(closing, F::shifted(src, -left, -top), image, wide, border, v1, buffer, work, RowSink());
   F::pass(!closing, F::shifted(image, left, top), dst, roi, border, v2, buffer, work, sink);
   return zelStatusOk;
@@ -258,7 +277,7 @@ ZelStatus compose(Op op, Plane src, Plane dst, ZeliSize roi, ZeliBorderType bord
                   uint8_t* buffer) {
   if (op == kGradient) {
     const int64_t step = F::rowBytes(roi.width);
-    if (step * roi.height > h.capacity) return zelStatusBadSize;
+    if ((SizeCalc(step) * roi.height).value() > h.capacity) return zelStatusBadSize;
     const View v = F::view(h.first);
     const Plane image = {static_cast<uint8_t*>(h.image), int(step), 0};
     const int64_t work = 2 * int64_t(h.workBytes);  // sequential passes: both areas each

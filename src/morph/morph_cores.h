@@ -326,12 +326,12 @@ void pointsCore(const T* src, int srcStep, T* dst, int dstStep, int W, int H, in
             if (!v.mask[int64_t(j) * mw + i]) continue;
             int px = x + i - ax;
             if ((px < 0 && !left) || (px >= W && !right)) px = clampInt(px, 0, W - 1);
-            const T value = row[px * c + ch];
+            const T value = minmax::ld(row + px * c + ch);
             best = any ? Op::s(best, value) : value;
             any = true;
           }
         }
-        out[x * c + ch] = best;
+        minmax::st(out + x * c + ch, best);
       }
     }
     sink(y);

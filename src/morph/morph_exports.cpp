@@ -153,7 +153,8 @@ ZelStatus borderGetSize(int dataType, int channels, bool bits, int roiWidth, Zel
 
 ZelStatus borderInit(int dataType, int channels, bool bits, int roiWidth, const Zel8u* mask, ZeliSize maskSize,
                      ZeliMorphState* state) {
-  const ZeliPoint centre = {(maskSize.width - 1) / 2, (maskSize.height - 1) / 2};
+  // In 64 bits: the sizes are checked after this, and may be INT_MIN.
+  const ZeliPoint centre = {int((int64_t(maskSize.width) - 1) / 2), int((int64_t(maskSize.height) - 1) / 2)};
   BuildRequest q = request(kModeInit, bits ? kBits : kNewer, dataType, channels, roiWidth, mask, maskSize, centre);
   q.state = state;
   return buildState(q);

@@ -6,6 +6,7 @@
 #include <algorithm>
 
 #include "core/alloc.h"
+#include "core/sizes.h"
 #include "core/status.h"
 
 namespace zelcv {
@@ -13,7 +14,7 @@ namespace morph {
 
 namespace {
 
-int64_t align16(int64_t n) { return alignSize(n, 16); }
+SizeCalc align16(SizeCalc n) { return alignSize(n, 16); }
 
 // What the analysis found, kept in the two scratch blocks: per row a status
 // byte and the first on column (6 bytes), and per row the last column of the
@@ -123,30 +124,40 @@ int elementSize(int dataType) {
   }
 }
 
-int64_t filterBufferSize(int dataType, int channels, int64_t w, int64_t mh) {
-  if (dataType == zel16u || dataType == zel16s) return (4 * w + 80) * mh * 2 + 64;
-  if (dataType == zel8u && channels == 1) return (2 * w + 80) * mh + 32;
-  if (dataType == zel8u && channels == 3) return ((3 * w + 32) * 2 + 16) * mh + 32;
-  if (dataType == zel32f && channels == 3) return ((12 * w + 32) * 2 + 16) * mh + 32;
-  if (dataType == zel32f && channels == 4) return (32 * w + 80) * mh + 32;
-  return (8 * w + 80) * mh + 32;  // 8u C4 and 32f C1
+// The formulas run in saturating size arithmetic: mask heights and widths
+// near 2^31 make products (the square of the mask height among them) that
+// no 64-bit integer holds; they saturate far above INT_MAX and are refused.
+int64_t filterBufferSize(int dataType, int channels, int64_t roiWidth, int64_t maskHeight) {
+  const SizeCalc w = roiWidth, mh = maskHeight;
+  SizeCalc size;
+  if (dataType == zel16u || dataType == zel16s) size = (4 * w + 80) * mh * 2 + 64;
+  else if (dataType == zel8u && channels == 1) size = (2 * w + 80) * mh + 32;
+  else if (dataType == zel8u && channels == 3) size = ((3 * w + 32) * 2 + 16) * mh + 32;
+  else if (dataType == zel32f && channels == 3) size = ((12 * w + 32) * 2 + 16) * mh + 32;
+  else if (dataType == zel32f && channels == 4) size = (32 * w + 80) * mh + 32;
+  else size = (8 * w + 80) * mh + 32;  // 8u C4 and 32f C1
+  return size.value();
 }
 
-int64_t commonBufferSize(int dataType, int channels, int64_t w, ZeliSize maskSize) {
-  const int64_t mh = maskSize.height, area = int64_t(maskSize.width) * mh;
-  const int64_t fast = filterBufferSize(dataType, channels, w, mh);
+int64_t commonBufferSize(int dataType, int channels, int64_t roiWidth, ZeliSize maskSize) {
+  const SizeCalc w = roiWidth, mh = maskSize.height, area = SizeCalc(maskSize.width) * mh;
+  const SizeCalc fast = filterBufferSize(dataType, channels, roiWidth, maskSize.height);
   // The square of the mask height is deliberate: the run kernel keeps the
   // run maxima of a whole mask height of rows.
-  const int64_t general = (mh * mh + 1) * (w * channels * elementSize(dataType) + 32) + 20 * mh + 36;
-  return std::max(fast, general) + align16(24 * mh) + align16(area) + align16(16 * mh + 48);
+  const SizeCalc general = (mh * mh + 1) * (w * channels * elementSize(dataType) + 32) + 20 * mh + 36;
+  return (maxSize(fast, general) + align16(24 * mh) + align16(area) + align16(16 * mh + 48)).value();
 }
 
-int64_t borderStateSize(int dataType, int channels, int64_t w, ZeliSize maskSize, bool bits) {
-  const int64_t mh = maskSize.height, area = int64_t(maskSize.width) * mh;
-  if (bits) return align16(area) + 80;
-  if (dataType == zel16u || dataType == zel16s) return align16(area) + 16 * mh + 128;
-  // 8u and 32f states are sized to hold the work buffer too (deliberate).
-  return 33 * align16(area) + 16 * mh + 128 + commonBufferSize(dataType, channels, w, maskSize);
+int64_t borderStateSize(int dataType, int channels, int64_t roiWidth, ZeliSize maskSize, bool bits) {
+  const SizeCalc mh = maskSize.height, area = SizeCalc(maskSize.width) * mh;
+  SizeCalc size;
+  if (bits)
+    size = align16(area) + 80;
+  else if (dataType == zel16u || dataType == zel16s)
+    size = align16(area) + 16 * mh + 128;
+  else  // 8u and 32f states are sized to hold the work buffer too (deliberate).
+    size = 33 * align16(area) + 16 * mh + 128 + commonBufferSize(dataType, channels, roiWidth, maskSize);
+  return size.value();
 }
 
 ZelStatus buildState(const BuildRequest& q) {
