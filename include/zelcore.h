@@ -13,12 +13,21 @@
 extern "C" {
 #endif
 
-#if defined(_WIN32)
+/* zelcore's own sources define ZELCORE_BUILDING_LIBRARY; zelcore.def names
+ * its exports on Windows. */
+#if defined(_WIN32) && !defined(ZELCORE_BUILDING_LIBRARY)
 #  define ZELCORE_API __declspec(dllimport)
-#elif defined(__GNUC__)
+#elif defined(__GNUC__) && !defined(_WIN32)
 #  define ZELCORE_API __attribute__((visibility("default")))
 #else
 #  define ZELCORE_API
+#endif
+
+/* The same calling convention as zelcv's (see ZELCV_CALL in zelcv/base.h). */
+#if defined(_WIN32)
+#  define ZELCORE_CALL __cdecl
+#else
+#  define ZELCORE_CALL
 #endif
 
 /* Alignment of every block returned by zelMalloc, in bytes. */
@@ -49,18 +58,18 @@ extern "C" {
 
 /* Returns a block of at least `bytes` bytes aligned to ZELCORE_ALIGNMENT,
  * or null when bytes <= 0 or the memory is not available. */
-ZELCORE_API void* zelMalloc(int bytes);
+ZELCORE_API void* ZELCORE_CALL zelMalloc(int bytes);
 
 /* Releases a block returned by zelMalloc; null is ignored. */
-ZELCORE_API void zelFree(void* ptr);
+ZELCORE_API void ZELCORE_CALL zelFree(void* ptr);
 
 /* Stores the size in bytes of the largest data (or unified) cache of this
  * processor. Returns zelCoreStatusOk, zelCoreStatusNullPointer, or
  * zelCoreStatusNoCacheInfo (and then leaves *bytes unchanged). */
-ZELCORE_API int zelGetMaxCacheSizeB(int* bytes);
+ZELCORE_API int ZELCORE_CALL zelGetMaxCacheSizeB(int* bytes);
 
 /* Returns the zelCpu* mask of features this process may use. */
-ZELCORE_API uint32_t zelGetEnabledCpuFeatures(void);
+ZELCORE_API uint32_t ZELCORE_CALL zelGetEnabledCpuFeatures(void);
 
 #ifdef __cplusplus
 }

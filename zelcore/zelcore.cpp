@@ -6,21 +6,39 @@
 #include <stdlib.h>
 #include <string.h>
 
+#if defined(_WIN32)
+#include <malloc.h>
+#endif
+
 extern "C" {
 
 void* zelMalloc(int bytes) {
   if (bytes <= 0) return nullptr;
+#if defined(_WIN32)
+  // The Windows C runtime has no aligned_alloc; its aligned blocks are
+  // released by _aligned_free only.
+  return _aligned_malloc(static_cast<size_t>(bytes), ZELCORE_ALIGNMENT);
+#else
   // Round up so that aligned_alloc's size-multiple rule always holds.
   size_t size = (static_cast<size_t>(bytes) + ZELCORE_ALIGNMENT - 1) & ~size_t(ZELCORE_ALIGNMENT - 1);
   return aligned_alloc(ZELCORE_ALIGNMENT, size);
+#endif
 }
 
+#if defined(_WIN32)
+void zelFree(void* ptr) { _aligned_free(ptr); }
+#else
 void zelFree(void* ptr) { free(ptr); }
+#endif
 
 }  // extern "C"
 
 namespace {
 
+#if defined(_WIN32)
+// Windows has no sysfs; the processor's own description serves.
+long largestCacheFromOs() { return 0; }
+#else
 // Parses a sysfs cache size such as "32K" or "8192K" or "16M".
 long parseCacheSize(const char* text) {
   char* end = nullptr;
@@ -54,6 +72,7 @@ long largestCacheFromOs() {
   }
   return largest;
 }
+#endif
 
 // Deterministic cache parameters (leaf 4 on one vendor, 0x8000001D on the other).
 long largestCacheFromCpuid() {

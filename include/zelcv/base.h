@@ -10,16 +10,25 @@
 extern "C" {
 #endif
 
-#if defined(_WIN32)
+/* On Windows a caller imports the functions from zelcv.dll. The library's
+ * own sources define ZELCV_BUILDING_LIBRARY: its exports are assembler stubs
+ * named by a .def file, and an import declaration there would make its
+ * references go through an import table that the DLL does not have. */
+#if defined(_WIN32) && !defined(ZELCV_BUILDING_LIBRARY)
 #  define ZELCV_API __declspec(dllimport)
-#elif defined(__GNUC__)
+#elif defined(__GNUC__) && !defined(_WIN32)
 #  define ZELCV_API __attribute__((visibility("default")))
 #else
 #  define ZELCV_API
 #endif
 
 /* The calling convention of every export, written between the result type
- * and the name, so that callers built with any default convention agree. */
+ * and the name, so that callers built with any default convention (/Gz,
+ * -mrtd, ...) agree. It is __cdecl on Windows: the caller removes the
+ * arguments, and a cdecl name carries no argument-size suffix, so that the
+ * DLL exports the plain names and the import libraries that MinGW and MSVC
+ * make from zelcv.def find them without aliases. On x86-64 there is only
+ * one convention and the keyword is ignored. */
 #if defined(_WIN32)
 #  define ZELCV_CALL __cdecl
 #else

@@ -1,6 +1,5 @@
 // The library frame through its exported interface: the export table, the
 // version record, the shared release routines and fault injection.
-#include <dlfcn.h>
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -38,14 +37,12 @@ TEST(ExportList, LibraryExportsExactlyTheListedNames) {
 // Each export is one indirect jump through slot i of one table, and names of
 // an alias group reach the same implementation.
 TEST(ExportList, StubsJumpThroughConsecutiveSlotsSharedByAliases) {
-  void* library = dlopen(zeltest::zelcvLibraryPath().c_str(), RTLD_NOW | RTLD_NOLOAD);
-  ASSERT_NE(library, nullptr);
   const auto& listing = exportListing();
   const void* const* firstSlot = nullptr;
   std::map<std::string, const void*> implementationOf;
   for (size_t i = 0; i < listing.size(); ++i) {
     SCOPED_TRACE(listing[i].name);
-    const void* stub = dlsym(library, listing[i].name);
+    const void* stub = zeltest::exportedAddress(listing[i].name);
     ASSERT_NE(stub, nullptr);
     const void* const* slot = zeltest::stubSlot(stub);
     ASSERT_NE(slot, nullptr) << "not a forwarding stub";
@@ -58,7 +55,6 @@ TEST(ExportList, StubsJumpThroughConsecutiveSlotsSharedByAliases) {
       EXPECT_EQ(*slot, known->second);
     }
   }
-  dlclose(library);
 }
 
 TEST(Version, RecordIsStaticAndExact) {
@@ -80,13 +76,11 @@ TEST(Version, RecordIsStaticAndExact) {
 // zelFree (seen here through the interposed support library).
 TEST(Release, SingleBlockFreeNames) {
   using FreeFn = ZelStatus (*)(void*);
-  void* library = dlopen(zeltest::zelcvLibraryPath().c_str(), RTLD_NOW | RTLD_NOLOAD);
-  ASSERT_NE(library, nullptr);
   for (const auto& e : exportListing()) {
     std::string impl = e.implementation;
     if (impl != "releaseSingleBlock" && impl != "releasePyramidLayer") continue;
     SCOPED_TRACE(e.name);
-    auto release = reinterpret_cast<FreeFn>(dlsym(library, e.name));
+    auto release = reinterpret_cast<FreeFn>(zeltest::exportedAddress(e.name));
     ASSERT_NE(release, nullptr);
     zeltest::FaultInjection faults;
     EXPECT_EQ(release(nullptr), zelStatusNullPointer);
@@ -98,7 +92,6 @@ TEST(Release, SingleBlockFreeNames) {
     EXPECT_EQ(faults.lastRelease(), block);
     EXPECT_EQ(faults.liveBlocks(), 0);
   }
-  dlclose(library);
 }
 
 TEST(FaultInjection, InterposesTheSupportLibrary) {

@@ -18,8 +18,12 @@ const std::vector<ExportEntry>& exportListing();
 // Path of the loaded zelcv shared library.
 std::string zelcvLibraryPath();
 
-// Names that the file's dynamic symbol table defines (global or weak).
+// Names that the file exports: those its dynamic symbol table defines
+// (global or weak) on ELF, its export table's names on Windows.
 std::vector<std::string> definedDynamicSymbols(const std::string& path);
+
+// The address under which the loaded library exports `name`, or null.
+const void* exportedAddress(const char* name);
 
 // The slot that the export stub at `stub` jumps through.
 const void* const* stubSlot(const void* stub);

@@ -1,3 +1,6 @@
+// Linux: the test executable defines zelcore's functions and the dynamic
+// linker binds zelcv's imports to them. Windows: fault_injection_windows.cpp.
+#if !defined(_WIN32)
 #include "support/fault_injection.h"
 
 #include <dlfcn.h>
@@ -107,3 +110,5 @@ void* FaultInjection::lastAllocation() const { return gInjection.lastAllocation;
 void* FaultInjection::lastRelease() const { return gInjection.lastRelease; }
 
 }  // namespace zeltest
+
+#endif  // !_WIN32
