@@ -58,6 +58,7 @@ void paintFill(T* image, int step, ZeliSize roi, ZeliPoint seed, const T* nv, co
   p.width = roi.width;
   p.test = test;
   for (int c = 0; c < C; ++c) p.nv[c] = nv[c];
+  if constexpr (kBytes<T, C>) p.prepare(test.lowBound(), test.highBound(), nv[0], test.guards());
   Span* stack = reinterpret_cast<Span*>(alignTo8(buffer));
   writeRecord<T, C>(region, runFill<decltype(p), kConn8>(p, roi, seed, stack, paintCapacity(roi)), nv);
 }
@@ -101,6 +102,7 @@ ZelStatus gradFill(T* image, int step, ZeliSize roi, ZeliPoint seed, const T* nv
                              buffer + int64_t(roi.width) + 3, int64_t(roi.width) + 2,
                              GradTest<T, C>(minDelta, maxDelta), {}};
   for (int c = 0; c < C; ++c) p.nv[c] = nv[c];
+  if constexpr (kBytes<T, C>) p.prepare(minDelta[0], maxDelta[0]);
   Span* stack = reinterpret_cast<Span*>(alignTo8(buffer + maskBytes));
   writeRecord<T, C>(region, runFill<decltype(p), kConn8>(p, roi, seed, stack, gradCapacity(roi)), nv);
   return zelStatusOk;

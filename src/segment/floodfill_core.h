@@ -40,6 +40,8 @@ inline uint8_t* alignTo8(uint8_t* p) {
 //   take(r, x)          paint (or mark) pixel x
 //   finish(r, l, rgt)   paint a popped span (deferred policies)
 //   extendLeft(r, x), extendRight(r, x)   whole run through a taken pixel
+//   nextJoin(r, x, to, s, l, rgt)  first column from x to `to` that joins
+//                                  from span [l, rgt] of row s, or to + 1
 template <class P, bool kConn8>
 class SpanFill {
  public:
@@ -100,10 +102,8 @@ class SpanFill {
             int64_t& area) {
     const typename P::Row r = p_.row(y);
     for (int x = from; x <= to;) {
-      if (!p_.joinsFromSpan(r, x, cur, e.left, e.right)) {
-        ++x;
-        continue;
-      }
+      x = p_.nextJoin(r, x, to, cur, e.left, e.right);
+      if (x > to) break;
       p_.take(r, x);
       const int runLeft = p_.extendLeft(r, x);
       const int runRight = p_.extendRight(r, x);
@@ -122,9 +122,16 @@ class SpanFill {
   int64_t count_ = 0;
 };
 
-// Run extension one pixel at a time, for policies that have nothing faster.
+// Scans and run extension one pixel at a time, for policies that have
+// nothing faster.
 template <class Derived>
 struct PixelRuns {
+  template <class Row>
+  int nextJoin(const Row& r, int x, int to, const Row& s, int left, int right) {
+    Derived& d = static_cast<Derived&>(*this);
+    while (x <= to && !d.joinsFromSpan(r, x, s, left, right)) ++x;
+    return x;
+  }
   template <class Row>
   int extendLeft(const Row& r, int x) {
     Derived& d = static_cast<Derived&>(*this);

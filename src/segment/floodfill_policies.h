@@ -13,6 +13,7 @@
 #include <type_traits>
 
 #include "segment/floodfill_core.h"
+#include "segment/floodfill_runs8u.h"
 
 namespace zelcv {
 namespace floodfill {
@@ -31,6 +32,9 @@ struct EqualTest {
     for (int c = 1; c < C; ++c) eq &= v[c] == s[c];
     return eq;
   }
+  T lowBound() const { return s[0]; }
+  T highBound() const { return s[0]; }
+  bool guards() const { return false; }
 };
 
 // Range criterion around the seed. A pixel that already holds the new value
@@ -50,6 +54,9 @@ struct RangeTest {
     }
     return in;
   }
+  T lowBound() const { return lo[0]; }
+  T highBound() const { return hi[0]; }
+  bool guards() const { return guardNew; }
 };
 
 template <typename T, int C>
@@ -105,9 +112,24 @@ struct GradTest<T, C, true> {
   }
 };
 
+template <typename T, int C, class Test>
+struct PaintPolicy;
+template <typename T, int C, bool kConn8>
+struct GradPolicy;
+
+// One-channel 8u fills scan and extend runs sixteen pixels at a time.
+template <typename T, int C>
+constexpr bool kBytes = std::is_same<T, uint8_t>::value && C == 1;
+template <typename T, int C, class Test>
+using PaintRuns = typename std::conditional<kBytes<T, C>, Runs8u<PaintPolicy<T, C, Test>>,
+                                            PixelRuns<PaintPolicy<T, C, Test>>>::type;
+template <typename T, int C, bool kConn8>
+using GradRuns = typename std::conditional<kBytes<T, C>, GradRuns8u<GradPolicy<T, C, kConn8>>,
+                                           PixelRuns<GradPolicy<T, C, kConn8>>>::type;
+
 // Paints as it goes; a pixel is free while the test accepts its value.
 template <typename T, int C, class Test>
-struct PaintPolicy : PixelRuns<PaintPolicy<T, C, Test>> {
+struct PaintPolicy : PaintRuns<T, C, Test> {
   static constexpr bool kDeferred = false;
   using Row = T*;
 
@@ -128,7 +150,7 @@ struct PaintPolicy : PixelRuns<PaintPolicy<T, C, Test>> {
 
 // Marks the visited mask; paints a span when it is popped and done.
 template <typename T, int C, bool kConn8>
-struct GradPolicy : PixelRuns<GradPolicy<T, C, kConn8>> {
+struct GradPolicy : GradRuns<T, C, kConn8> {
   static constexpr bool kDeferred = true;
   struct Row {
     T* px;
@@ -158,6 +180,10 @@ struct GradPolicy : PixelRuns<GradPolicy<T, C, kConn8>> {
   void take(const Row& r, int x) const { r.seen[x] = 1; }
   void finish(const Row& r, int left, int right) const {
     T* p = r.px + left * C;
+    if (C == 1) {
+      std::fill(p, p + (right - left + 1), nv[0]);
+      return;
+    }
     for (int x = left; x <= right; ++x, p += C)
       for (int c = 0; c < C; ++c) p[c] = nv[c];
   }
