@@ -149,9 +149,10 @@ struct PaintPolicy : PaintRuns<T, C, Test> {
 };
 
 // Marks the visited mask; paints a span when it is popped and done.
-template <typename T, int C, bool kConn8>
-struct GradPolicy : GradRuns<T, C, kConn8> {
+template <typename T, int C, bool kConn8_>
+struct GradPolicy : GradRuns<T, C, kConn8_> {
   static constexpr bool kDeferred = true;
+  static constexpr bool kConn8 = kConn8_;
   struct Row {
     T* px;
     uint8_t* seen;
@@ -180,8 +181,8 @@ struct GradPolicy : GradRuns<T, C, kConn8> {
   void take(const Row& r, int x) const { r.seen[x] = 1; }
   void finish(const Row& r, int left, int right) const {
     T* p = r.px + left * C;
-    if (C == 1) {
-      std::fill(p, p + (right - left + 1), nv[0]);
+    if constexpr (kBytes<T, C>) {
+      fillBytes(p, right - left + 1, nv[0]);
       return;
     }
     for (int x = left; x <= right; ++x, p += C)

@@ -94,13 +94,14 @@ void drawScene(TestImage<T>& im, std::mt19937& rng, bool ramp) {
 }
 
 // Sizes: 1x1, one row, one column (from 12 rows, where the stack of a column
-// cannot fill up) and random ones.
+// cannot fill up), wide ones and random ones.
 ZeliSize randomSize(std::mt19937& rng, int i) {
   auto uni = [&](int lo, int hi) { return std::uniform_int_distribution<int>(lo, hi)(rng); };
   switch (i % 8) {
     case 0: return {1, 1};
     case 1: return {uni(1, 70), 1};
     case 2: return {1, uni(12, 50)};
+    case 3: return {uni(40, 200), uni(2, 24)};  // long runs for the 16-pixel paths
     default: return {uni(8, 48), uni(8, 40)};
   }
 }
