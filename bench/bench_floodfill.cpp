@@ -1,7 +1,8 @@
 // Flood fill against cv::floodFill on 8u one-channel pictures: plain fills
 // (equal to the seed), fixed-range and floating-range (gradient) fills, 4-
 // and 8-connected. The seed lies in a background that covers most of the
-// picture around discs and bars, so the fill visits a large region. Each
+// picture around discs and bars, so the fill visits a large region (for the
+// floating range, once noisy and once a smooth ramp). Each
 // iteration restores the picture with the timer paused.
 #include <opencv2/imgproc.hpp>
 
@@ -13,9 +14,13 @@ namespace {
 
 using zelbench::Size;
 
-// Background 100 (with noise of +-2 for the range fills), obstacles 220.
-cv::Mat scene(int width, int height, bool noisy) {
+// Background 100 (with noise of +-2 for the range fills, or a gentle ramp
+// from 40 to 160 across the picture), obstacles 220.
+cv::Mat scene(int width, int height, bool noisy, bool ramp = false) {
   cv::Mat m(height, width, CV_8UC1, cv::Scalar(100));
+  if (ramp)
+    for (int y = 0; y < height; ++y)
+      for (int x = 0; x < width; ++x) m.at<uint8_t>(y, x) = uint8_t(40 + (120 * x) / width);
   if (noisy) {
     cv::Mat noise(height, width, CV_8UC1);
     cv::RNG rng(11);
@@ -33,16 +38,23 @@ cv::Mat scene(int width, int height, bool noisy) {
     const cv::Point b(rng.uniform(0, width), rng.uniform(0, height));
     cv::line(m, a, b, cv::Scalar(220), 2);
   }
-  m(cv::Rect(0, 0, 4, 4)).setTo(cv::Scalar(100));
+  // Keep the seed's corner free of obstacles.
+  for (int y = 0; y < 4; ++y)
+    for (int x = 0; x < 4; ++x) m.at<uint8_t>(y, x) = ramp ? uint8_t(40 + (120 * x) / width) : 100;
   return m;
 }
 
-enum class Kind { Plain, Range, Grad };
+enum class Kind { Plain, Range, Grad, GradSmooth };
 
 void registerCase(const Size& s, Kind kind, bool conn8) {
-  const char* kindName = kind == Kind::Plain ? "plain" : kind == Kind::Range ? "fixed_range" : "floating_range";
+  const char* kindName = kind == Kind::Plain    ? "plain"
+                         : kind == Kind::Range  ? "fixed_range"
+                         : kind == Kind::Grad   ? "floating_range"
+                                                : "floating_range_ramp";
   const std::string name = std::string(kindName) + (conn8 ? "_8con/" : "_4con/") + s.name;
-  auto pristine = std::make_shared<cv::Mat>(scene(s.width, s.height, kind != Kind::Plain));
+  const bool ramp = kind == Kind::GradSmooth;
+  if (ramp) kind = Kind::Grad;
+  auto pristine = std::make_shared<cv::Mat>(scene(s.width, s.height, kind != Kind::Plain && !ramp, ramp));
   const cv::Point seed(1, 1);
   const int lo = 3, up = 3;
   zelbench::registerPair(
@@ -99,7 +111,7 @@ void registerCase(const Size& s, Kind kind, bool conn8) {
 void registerFloodFill() {
   for (const Size& s : zelbench::kSizes) {
     if (s.width > 1920) continue;
-    for (Kind kind : {Kind::Plain, Kind::Range, Kind::Grad})
+    for (Kind kind : {Kind::Plain, Kind::Range, Kind::Grad, Kind::GradSmooth})
       for (bool conn8 : {false, true}) registerCase(s, kind, conn8);
   }
 }
