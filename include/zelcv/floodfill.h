@@ -72,8 +72,8 @@ typedef struct {
 /* Buffer sizes: FloodFillGetSize for Plain and Range, 6 x w x h + 32 bytes
  * (evaluated as (24 x h x w) / 4 + 32); FloodFillGetSize_Grad for Grad,
  * 16 x w x h + (w + 2) x (h + 2) + 64 bytes. Both are evaluated in 64-bit
- * arithmetic and stored as their low 32 bits. Checks: null bufferSize -8;
- * w or h < 1 -6. */
+ * arithmetic. Checks: null bufferSize -8; w or h < 1 -6; a size above
+ * INT_MAX -6 (nothing written). */
 ZELCV_API ZelStatus ZELCV_CALL zeliFloodFillGetSize(ZeliSize roiSize, int* bufferSize);
 ZELCV_API ZelStatus ZELCV_CALL zeliFloodFillGetSize_Grad(ZeliSize roiSize, int* bufferSize);
 

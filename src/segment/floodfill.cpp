@@ -1,5 +1,6 @@
 // Flood fill: the argument checks, the buffer layouts and the exports of the
 // plain, range and gradient criteria.
+#include <limits.h>
 #include <stdint.h>
 
 #include "core/status.h"
@@ -113,7 +114,9 @@ ZelStatus sizeQuery(ZeliSize roi, int* bufferSize, Criterion c) {
   const int64_t w = roi.width, h = roi.height;
   const int64_t bytes =
       c == Criterion::Grad ? (48 * h * w) / 3 + (w + 2) * (h + 2) + 64 : (24 * h * w) / 4 + 32;
-  *bufferSize = int(int32_t(uint32_t(uint64_t(bytes))));
+  // A size that an int cannot hold is refused rather than wrapped.
+  if (bytes > INT_MAX) return zelStatusBadSize;
+  *bufferSize = int(bytes);
   return zelStatusOk;
 }
 
