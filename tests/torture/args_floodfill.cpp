@@ -1,0 +1,48 @@
+// Torture table: flood fill. The record (48 bytes) is passed as a guarded
+// block; the seed is the ROI's first pixel, so every described call fills.
+#include "torture/torture.h"
+
+TORTURE_FAMILY(floodfill) {
+  return {
+      TORTURE(zeliFloodFillGetSize, "roi res"),
+      TORTURE(zeliFloodFillGetSize_Grad, "roi res"),
+      TORTURE(zeliFloodFill_4Con_8u_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_4Con_8u_C3IR, "io3 roi pt=0,0 arr=3,7 buf=48 buf"),
+      TORTURE(zeliFloodFill_4Con_16u_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_4Con_16u_C3IR, "io3 roi pt=0,0 arr=3,7 buf=48 buf"),
+      TORTURE(zeliFloodFill_4Con_32s_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_4Con_32f_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_4Con_32f_C3IR, "io3 roi pt=0,0 arr=3,7 buf=48 buf"),
+      TORTURE(zeliFloodFill_8Con_8u_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_8Con_8u_C3IR, "io3 roi pt=0,0 arr=3,7 buf=48 buf"),
+      TORTURE(zeliFloodFill_8Con_16u_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_8Con_16u_C3IR, "io3 roi pt=0,0 arr=3,7 buf=48 buf"),
+      TORTURE(zeliFloodFill_8Con_32s_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_8Con_32f_C1IR, "io1 roi pt=0,0 =7 buf=48 buf"),
+      TORTURE(zeliFloodFill_8Con_32f_C3IR, "io3 roi pt=0,0 arr=3,7 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range4Con_8u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range4Con_8u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range4Con_16u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range4Con_16u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range4Con_32f_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range4Con_32f_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range8Con_8u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range8Con_8u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range8Con_16u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range8Con_16u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range8Con_32f_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Range8Con_32f_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad4Con_8u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad4Con_8u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad4Con_16u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad4Con_16u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad4Con_32f_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad4Con_32f_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad8Con_8u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad8Con_8u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad8Con_16u_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad8Con_16u_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad8Con_32f_C1IR, "io1 roi pt=0,0 =7 =1 =2 buf=48 buf"),
+      TORTURE(zeliFloodFill_Grad8Con_32f_C3IR, "io3 roi pt=0,0 arr=3,7 arr=3,1 arr=3,2 buf=48 buf"),
+  };
+}
