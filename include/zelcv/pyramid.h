@@ -132,8 +132,8 @@ ZELCV_API ZelStatus ZELCV_CALL zeliPyramidFree(ZeliPyramid* pyramid);
  * memory (-9, *state untouched).
  * Layer operation checks: src, dst or state null (-8); srcRoi < 1 (-6);
  * srcStep, dstStep below their row bytes (-14); 16u and 32f steps not a
- * multiple of the element size (-108); a state whose rate is outside
- * (1, 10] or that is not a layer state of this direction (-5), of another
+ * multiple of the element size (-108); a state that is not a layer state of
+ * this direction (-17), whose rate is outside (1, 10] (-5), of another
  * element type (-12) or channel count (-53); then the destination size (-6):
  *   down: the size after the first chain entry with the source's height
  *   (widths not compared), or the down size of srcRoi when no entry has it;
