@@ -10,6 +10,7 @@
 #include <emmintrin.h>
 #include <stddef.h>
 #include <stdint.h>
+#include <string.h>
 
 #include <type_traits>
 
@@ -122,6 +123,45 @@ void rowDown(const T* s, int width, Mid<T>* m) {
       splitEvenOdd<T>(_mm_loadu_si128(reinterpret_cast<const __m128i*>(p + 4)), e, unused);
       __m128i h = _mm_add_epi16(_mm_add_epi16(_mm_add_epi16(a, e), times4(_mm_add_epi16(b, d))), times6(c));
       _mm_storeu_si128(reinterpret_cast<__m128i*>(m + i), h);
+    }
+  }
+  if constexpr (std::is_same<T, float>::value && kCh == 1) {
+    // Four outputs read pixels 2i - 2 .. 2i + 9; even and odd lanes by shuffles.
+    auto even = [](const float* p) {
+      return _mm_shuffle_ps(_mm_loadu_ps(p), _mm_loadu_ps(p + 4), _MM_SHUFFLE(2, 0, 2, 0));
+    };
+    auto odd = [](const float* p) {
+      return _mm_shuffle_ps(_mm_loadu_ps(p), _mm_loadu_ps(p + 4), _MM_SHUFFLE(3, 1, 3, 1));
+    };
+    for (; i + 3 <= last && 2 * i + 9 < width; i += 4) {
+      const float* p = s + 2 * i - 2;
+      const __m128 a = even(p), b = odd(p), c = even(p + 2), d = odd(p + 2), e = even(p + 4);
+      const __m128 h = _mm_add_ps(_mm_add_ps(_mm_add_ps(a, e), _mm_mul_ps(_mm_add_ps(b, d), _mm_set1_ps(4.0f))),
+                                  _mm_mul_ps(c, _mm_set1_ps(6.0f)));
+      _mm_storeu_ps(m + i, h);
+    }
+  }
+  if constexpr (!std::is_same<T, float>::value && kCh == 3) {
+    // Two outputs per vector: a 16-byte load at pixel 2i + d holds the tap's
+    // pixels for outputs i (bytes 0..2) and i + 1 (bytes 6..8); they are
+    // joined into bytes 0..5 and widened. Outputs i, i + 1 read pixels up to
+    // 2i + 4, and the load up to byte 6i + 21.
+    const __m128i low3 = _mm_set_epi32(0, 0, 0, 0x00FFFFFF),
+                  next3 = _mm_set_epi32(0, 0, 0xFFFF, int(0xFF000000u));
+    auto tap = [&](const T* q) {
+      const __m128i t = _mm_loadu_si128(reinterpret_cast<const __m128i*>(q));
+      const __m128i joined = _mm_or_si128(_mm_and_si128(t, low3), _mm_and_si128(_mm_srli_si128(t, 3), next3));
+      if constexpr (std::is_same<T, uint8_t>::value)
+        return _mm_unpacklo_epi8(joined, _mm_setzero_si128());
+      else
+        return _mm_srai_epi16(_mm_unpacklo_epi8(joined, joined), 8);
+    };
+    for (; i + 1 <= last && 6 * i + 21 < 3 * width; i += 2) {
+      const T* q = s + 6 * i;
+      const __m128i a = tap(q - 6), b = tap(q - 3), c = tap(q), d = tap(q + 3), e = tap(q + 6);
+      const __m128i h = _mm_add_epi16(_mm_add_epi16(_mm_add_epi16(a, e), times4(_mm_add_epi16(b, d))), times6(c));
+      // Lanes 6 and 7 spill into the next output, written next or by the edge.
+      _mm_storeu_si128(reinterpret_cast<__m128i*>(m + 3 * i), h);
     }
   }
   for (; i <= last; ++i) {

@@ -188,12 +188,37 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
     float* out = st->ring + st->rowFloats * size_t(slot);
     if (tags && tags[slot] == y) return out;
     const T* s = srcRow(y);
-    for (int j = 0; j < m; ++j) {
+    // Columns whose taps all lie inside the row read it directly; the rest
+    // go through the border rule.
+    auto edgeColumn = [&](int j) {
       const int c0 = cols[j] - R;
       for (int c = 0; c < kCh; ++c) {
         float acc = taps[0] * float(s[borderIndex(c0, w, zelBorderMirror) * kCh + c]);
         for (int k = 1; k < K; ++k) acc += taps[k] * float(s[borderIndex(c0 + k, w, zelBorderMirror) * kCh + c]);
         out[j * kCh + c] = acc;
+      }
+    };
+    int lo = 0, hi = m;
+    while (lo < m && cols[lo] - R < 0) edgeColumn(lo++);
+    while (hi > lo && cols[hi - 1] + R > w - 1) edgeColumn(--hi);
+    if (exact && kCh == 1) {
+      // Every second column: tap by tap over the row, the sum kept in order.
+      const T* p = s + cols[lo] - R;
+      for (int k = 0; k < K; ++k) {
+        const float t = taps[k];
+        if (k == 0)
+          for (int j = lo; j < hi; ++j) out[j] = t * float(p[2 * (j - lo)]);
+        else
+          for (int j = lo; j < hi; ++j) out[j] += t * float(p[2 * (j - lo) + k]);
+      }
+    } else {
+      for (int j = lo; j < hi; ++j) {
+        const T* p = s + (cols[j] - R) * kCh;
+        for (int c = 0; c < kCh; ++c) {
+          float acc = taps[0] * float(p[c]);
+          for (int k = 1; k < K; ++k) acc += taps[k] * float(p[k * kCh + c]);
+          out[j * kCh + c] = acc;
+        }
       }
     }
     if (tags) tags[slot] = y;
@@ -211,10 +236,12 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
         const int r = borderIndex(y - R + k, h, zelBorderMirror);
         rows[k] = hrow(r, r % K);
       }
-      for (int i = 0; i < n; ++i) {
-        float acc = taps[0] * rows[0][i];
-        for (int k = 1; k < K; ++k) acc += taps[k] * rows[k][i];
-        out[i] = acc;
+      // Tap by tap over the row (the same sums in the same order).
+      for (int i = 0; i < n; ++i) out[i] = taps[0] * rows[0][i];
+      for (int k = 1; k < K; ++k) {
+        const float t = taps[k];
+        const float* r = rows[k];
+        for (int i = 0; i < n; ++i) out[i] += t * r[i];
       }
     } else {
       // Long kernels: one ring row at a time, in tap order.
