@@ -326,6 +326,64 @@ struct RowRing {
   }
 };
 
+// Three-channel 8-bit reduction, columns first: each destination row sums
+// its five source rows into one row of 16-bit column sums, then filters that
+// row once at the even pixels. (Filtering rows first would filter every
+// source row at the decimated positions, twice the work for three channels,
+// whose even pixels do not fall on vector lanes.) Integer sums are exact, so
+// the order of the passes does not change a bit.
+template <typename T>
+void pyrDownC3(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, uint8_t* buffer) {
+  const int width = roi.width, height = roi.height;
+  const int outWidth = (width + 1) / 2, outHeight = (height + 1) / 2, n = 3 * width;
+  const int last = (width - 3) / 2;  // outputs 1 .. last read only pixels inside the row
+  int16_t* v = reinterpret_cast<int16_t*>(alignUp(buffer, 64));
+  const __m128i keep3 = _mm_set_epi32(0, 0, 0xFFFF, -1);
+  for (int j = 0; j < outHeight; ++j) {
+    const T* r[5];
+    for (int k = 0; k < 5; ++k) r[k] = rowAt(src, srcStep, borderIndex(2 * j - 2 + k, height, zelBorderMirror));
+    int e = 0;
+    for (; e + 8 <= n; e += 8) {
+      const __m128i s = _mm_add_epi16(
+          _mm_add_epi16(_mm_add_epi16(widen8(r[0] + e), widen8(r[4] + e)),
+                        times4(_mm_add_epi16(widen8(r[1] + e), widen8(r[3] + e)))),
+          times6(widen8(r[2] + e)));
+      _mm_storeu_si128(reinterpret_cast<__m128i*>(v + e), s);
+    }
+    for (; e < n; ++e) v[e] = int16_t(sum5(int(r[0][e]), int(r[1][e]), int(r[2][e]), int(r[3][e]), int(r[4][e])));
+    T* d = rowAt(dst, dstStep, j);
+    auto px = [&](int pos, int c) { return int(v[borderIndex(pos, width, zelBorderMirror) * 3 + c]); };
+    auto edge = [&](int i) {
+      for (int c = 0; c < 3; ++c)
+        d[3 * i + c] =
+            finishDown<T>(sum5(px(2 * i - 2, c), px(2 * i - 1, c), px(2 * i, c), px(2 * i + 1, c), px(2 * i + 2, c)));
+    };
+    edge(0);
+    int i = 1;
+    // Outputs i and i + 1 in lanes 0..2 and 3..5: each tap joins the pixel of
+    // output i with the one two pixels on, which output i + 1 needs. The loads
+    // reach element 6i + 19; the 8-byte store writes two bytes of output
+    // i + 2, which a later step writes again.
+    for (; i + 1 <= last && 6 * i + 19 < n && 3 * i + 8 <= 3 * outWidth; i += 2) {
+      __m128i q[7];
+      for (int k = 0; k < 7; ++k)
+        q[k] = _mm_and_si128(_mm_loadu_si128(reinterpret_cast<const __m128i*>(v + 3 * (2 * i - 2 + k))), keep3);
+      __m128i t[5];
+      for (int k = 0; k < 5; ++k) t[k] = _mm_or_si128(q[k], _mm_slli_si128(q[k + 2], 6));
+      const __m128i s =
+          _mm_add_epi16(_mm_add_epi16(_mm_add_epi16(t[0], t[4]), times4(_mm_add_epi16(t[1], t[3]))), times6(t[2]));
+      const __m128i res = shiftDown<T>(_mm_add_epi16(s, _mm_set1_epi16(128)));
+      _mm_storel_epi64(reinterpret_cast<__m128i*>(d + 3 * i), pack16<T>(res, res));
+    }
+    for (; i <= last; ++i)
+      for (int c = 0; c < 3; ++c) {
+        const int16_t* p = v + 6 * i + c;
+        d[3 * i + c] = finishDown<T>(sum5(int(p[-6]), int(p[-3]), int(p[0]), int(p[3]), int(p[6])));
+      }
+    for (; i < outWidth; ++i) edge(i);
+  }
+}
+
 template <typename T, int kCh>
 void pyrDown(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, uint8_t* buffer) {
   using W = Wide<T>;
@@ -334,6 +392,9 @@ void pyrDown(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, uint8
   RowRing<Mid<T>> ring{alignUp(buffer, 64), downRowBytes(width, kCh), 6, {-1, -1, -1, -1, -1, -1}};
   auto fill = [&](int y, Mid<T>* m) { rowDown<T, kCh>(rowAt(src, srcStep, y), width, m); };
   const int n = outWidth * kCh;
+  if constexpr (kCh == 3 && !std::is_same<T, float>::value) {
+    if (height > 2) return pyrDownC3<T>(src, srcStep, dst, dstStep, roi, buffer);
+  }
   if (height <= 2) {
     // Equal weights on the two rows (row 0 twice for one row): 1/32 of the sum.
     const Mid<T>* r0 = ring.get(0, fill);
