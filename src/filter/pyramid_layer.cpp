@@ -3,6 +3,7 @@
 // Only the filtered samples that the resampling reads are computed: the
 // needed source columns are listed once per call, and each needed filtered
 // row is formed from a ring of horizontally filtered rows.
+#include <emmintrin.h>
 #include <limits.h>
 #include <string.h>
 
@@ -202,14 +203,32 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
     while (lo < m && cols[lo] - R < 0) edgeColumn(lo++);
     while (hi > lo && cols[hi - 1] + R > w - 1) edgeColumn(--hi);
     if (exact && kCh == 1) {
-      // Every second column: tap by tap over the row, the sum kept in order.
-      const T* p = s + cols[lo] - R;
-      for (int k = 0; k < K; ++k) {
-        const float t = taps[k];
-        if (k == 0)
-          for (int j = lo; j < hi; ++j) out[j] = t * float(p[2 * (j - lo)]);
-        else
-          for (int j = lo; j < hi; ++j) out[j] += t * float(p[2 * (j - lo) + k]);
+      // Every second column. 8u: eight columns per step from the even bytes
+      // of one load per tap; the sum of each column in tap order throughout.
+      const int start = cols[lo] - R;
+      int j = lo;
+      if constexpr (std::is_same<T, uint8_t>::value) {
+        for (; j + 8 <= hi && start + 2 * (j - lo) + K + 15 <= w; j += 8) {
+          const T* q = s + start + 2 * (j - lo);
+          __m128 acc0 = _mm_setzero_ps(), acc1 = _mm_setzero_ps();
+          for (int k = 0; k < K; ++k) {
+            const __m128i even =
+                _mm_and_si128(_mm_loadu_si128(reinterpret_cast<const __m128i*>(q + k)), _mm_set1_epi16(0xFF));
+            const __m128 t = _mm_set1_ps(taps[k]);
+            const __m128 lo4 = _mm_mul_ps(t, _mm_cvtepi32_ps(_mm_unpacklo_epi16(even, _mm_setzero_si128())));
+            const __m128 hi4 = _mm_mul_ps(t, _mm_cvtepi32_ps(_mm_unpackhi_epi16(even, _mm_setzero_si128())));
+            acc0 = k == 0 ? lo4 : _mm_add_ps(acc0, lo4);
+            acc1 = k == 0 ? hi4 : _mm_add_ps(acc1, hi4);
+          }
+          _mm_storeu_ps(out + j, acc0);
+          _mm_storeu_ps(out + j + 4, acc1);
+        }
+      }
+      for (; j < hi; ++j) {
+        const T* q = s + start + 2 * (j - lo);
+        float acc = taps[0] * float(q[0]);
+        for (int k = 1; k < K; ++k) acc += taps[k] * float(q[k]);
+        out[j] = acc;
       }
     } else {
       for (int j = lo; j < hi; ++j) {
@@ -259,7 +278,22 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
     const Sample sy = samplePosition(y, h, st->rate, down);
     const float* f0 = frow(sy.first);
     if (exact) {
-      for (int x = 0; x < dstRoi.width; ++x)
+      int x = 0;
+      if constexpr (std::is_same<T, uint8_t>::value && kCh == 1) {
+        // Columns read in order (all but clamped ones at the end): eight
+        // conversions per step, the same clamps and truncation.
+        int plain = dstRoi.width;
+        while (plain > 0 && pick[2 * (plain - 1)] != plain - 1) --plain;
+        const __m128 half = _mm_set1_ps(0.5f), top = _mm_set1_ps(255.0f), zero = _mm_setzero_ps();
+        auto toInt = [&](const float* p) {
+          return _mm_cvttps_epi32(_mm_min_ps(_mm_max_ps(_mm_add_ps(_mm_loadu_ps(p), half), zero), top));
+        };
+        for (; x + 8 <= plain; x += 8) {
+          const __m128i w16 = _mm_packs_epi32(toInt(f0 + x), toInt(f0 + x + 4));
+          _mm_storel_epi64(reinterpret_cast<__m128i*>(d + x), _mm_packus_epi16(w16, w16));
+        }
+      }
+      for (; x < dstRoi.width; ++x)
         for (int c = 0; c < kCh; ++c) d[x * kCh + c] = convert<T>(f0[pick[2 * x] * kCh + c]);
       continue;
     }
