@@ -30,5 +30,6 @@ int demoFilter(const DemoImage* image, const char* outDir);
 int demoMorph(const DemoImage* image, const char* outDir);
 int demoMorphAdv(const DemoImage* image, const char* outDir);
 int demoFloodFill(const DemoImage* image, const char* outDir);
+int demoPyramid(const DemoImage* image, const char* outDir);
 
 #endif

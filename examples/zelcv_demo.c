@@ -34,6 +34,7 @@ int main(int argc, char** argv) {
   failures |= demoMorph(&image, outDir);
   failures |= demoMorphAdv(&image, outDir);
   failures |= demoFloodFill(&image, outDir);
+  failures |= demoPyramid(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

@@ -18,5 +18,6 @@
 #include "zelcv/morph_adv.h"
 #include "zelcv/integral.h"
 #include "zelcv/floodfill.h"
+#include "zelcv/pyramid.h"
 
 #endif /* ZELCV_H */

@@ -144,30 +144,16 @@ typedef struct {
 ZELCV_API const ZelLibraryVersion* ZELCV_CALL zelcvGetLibVersion(void);
 
 /* ---- State objects ------------------------------------------------------ */
-/* Opaque states. An object made by an InitAlloc function is released by the
+/* Opaque states (the pyramid record and layer states are in zelcv/pyramid.h).
+ * An object made by an InitAlloc function is released by the
  * matching Free function; Free(NULL) returns zelStatusNullPointer. */
 typedef struct ZeliMorphState ZeliMorphState;
 typedef struct ZeliMorphAdvState ZeliMorphAdvState;
-typedef struct ZeliPyramid ZeliPyramid;
-typedef struct ZeliPyramidLayerState ZeliPyramidLayerState;
 typedef struct ZeliInpaintState ZeliInpaintState;
 
 ZELCV_API ZelStatus ZELCV_CALL zeliMorphologyFree(ZeliMorphState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidFree(ZeliPyramid* pyramid);
 ZELCV_API ZelStatus ZELCV_CALL zeliInpaintFree_8u_C1R(ZeliInpaintState* state);
 ZELCV_API ZelStatus ZELCV_CALL zeliInpaintFree_8u_C3R(ZeliInpaintState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerDownFree_8u_C1R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerDownFree_8u_C3R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerDownFree_16u_C1R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerDownFree_16u_C3R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerDownFree_32f_C1R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerDownFree_32f_C3R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerUpFree_8u_C1R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerUpFree_8u_C3R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerUpFree_16u_C1R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerUpFree_16u_C3R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerUpFree_32f_C1R(ZeliPyramidLayerState* state);
-ZELCV_API ZelStatus ZELCV_CALL zeliPyramidLayerUpFree_32f_C3R(ZeliPyramidLayerState* state);
 
 #ifdef __cplusplus
 }

@@ -252,7 +252,7 @@ bool Spec::pointer() const {
 
 int64_t Spec::checkedRowBytes(int64_t width) const {
   if (role == Role::BitImage) return (width + extraCols + 7) / 8;
-  return (width + extraCols) * channels * elemSize;
+  return (scaled(width) + extraCols) * channels * elemSize;
 }
 
 std::string parseRoles(const Entry& e, std::vector<Spec>& specs) {
@@ -359,6 +359,8 @@ std::string parseRoles(const Entry& e, std::vector<Spec>& specs) {
       if (m.rfind("w+", 0) == 0) s.extraCols = std::atoi(m.c_str() + 2);
       else if (m.rfind("h+", 0) == 0) s.extraRows = std::atoi(m.c_str() + 2);
       else if (m.rfind("r+", 0) == 0) s.readCols = std::atoi(m.c_str() + 2);
+      else if (m == "x2") s.scale = 2;
+      else if (m == "d2") s.scale = -2;
       else if (m == "na") s.alignChecked = false;
       else if (m == "@s" || m == "@t") s.rank = m[1];
       else if (m == "W") s.boundW = true;
@@ -443,6 +445,7 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
   std::vector<void*> newSlots(specs.size(), nullptr);
   static int newSentinel;
   std::vector<void*> objects(specs.size(), nullptr);
+  std::vector<void*> states(specs.size(), nullptr);  // states the library allocated
 
   for (std::size_t i = 0; i < specs.size(); ++i) {
     const Spec& s = specs[i];
@@ -453,9 +456,9 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
       case Role::Image:
       case Role::BitImage: {
         ImageMemory& im = images[i];
-        const int cols = w + s.extraCols + s.readCols;
+        const int cols = int(s.scaled(w)) + s.extraCols + s.readCols;
         const int bitOffset = 0;
-        im.rows = h + s.extraRows;
+        im.rows = int(s.scaled(h)) + s.extraRows;
         im.extent = s.role == Role::BitImage ? std::size_t(bitOffset + cols + 7) / 8
                                              : std::size_t(cols) * size_t(s.channels) * size_t(s.elemSize);
         int step = int(std::max<int64_t>(std::max<int64_t>(s.checkedRowBytes(w), int64_t(im.extent)), 1));
@@ -483,7 +486,7 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
         val.p = im.rowPointers.data();
         break;
       }
-      case Role::Roi: val.size = v.roi; break;
+      case Role::Roi: val.size = {int(s.scaled(v.roi.width)), int(s.scaled(v.roi.height))}; break;
       case Role::RoiWidth: val.i = w; break;
       case Role::Size: val.size = s.size; break;
       case Role::Point: val.point = s.point; break;
@@ -511,6 +514,7 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
       case Role::State:
         val.p = findMaker(s.maker)->make(arena, v.roi);
         if (!val.p) out.setupError = "maker " + s.maker + " failed";
+        if (findMaker(s.maker)->release) states[i] = val.p;
         break;
       case Role::New:
         newSlots[i] = &newSentinel;
@@ -525,8 +529,10 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
     }
   }
   if (!out.setupError.empty()) {
-    for (std::size_t i = 0; i < specs.size(); ++i)
+    for (std::size_t i = 0; i < specs.size(); ++i) {
       if (objects[i]) findMaker(specs[i].maker)->release(objects[i]);
+      if (states[i]) findMaker(specs[i].maker)->release(states[i]);
+    }
     return out;
   }
 
@@ -600,6 +606,8 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
       }
     }
     if (s.role == Role::Object && out.status != zelStatusOk) findMaker(s.maker)->release(objects[i]);
+    // A state the library allocated (its maker can release it) goes back now.
+    if (states[i]) findMaker(s.maker)->release(states[i]);
     if (s.role == Role::Result) out.results.push_back(results[i]);
     if (images[i].memory && !images[i].memory->guardsIntact()) out.guardsIntact = false;
     if (blocks[i] && !blocks[i]->guardsIntact()) out.guardsIntact = false;

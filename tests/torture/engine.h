@@ -43,6 +43,7 @@ struct Spec {
   int extraCols = 0;    // columns beyond the ROI counted by the step check
   int extraRows = 0;
   int readCols = 0;     // columns beyond those read but not counted by the step check
+  int scale = 1;        // images and roi: 2 doubles the ROI (:x2), -2 halves it rounding up (:d2)
   int rowsExtra = 0;    // Rows: height + rowsExtra pointers
   bool alignChecked = true;
   char rank = 'p';      // null check: 'p' with the pointers, 's' after the size, 't' after the steps
@@ -61,6 +62,8 @@ struct Spec {
   bool isImage() const { return role == Role::Image || role == Role::BitImage; }
   bool stepped() const { return isImage(); }
   bool pointer() const;
+  // A ROI dimension as this image or size sees it.
+  int64_t scaled(int64_t n) const { return scale == 2 ? 2 * n : scale == -2 ? (n + 1) / 2 : n; }
   // Bytes the step of an image must reach for a ROI width.
   int64_t checkedRowBytes(int64_t width) const;
   bool readsPixels() const { return (role == Role::Image && dir != 'o') || (role == Role::Rows && dir == 'i') ||
