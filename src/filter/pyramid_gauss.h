@@ -10,7 +10,6 @@
 #include <emmintrin.h>
 #include <stddef.h>
 #include <stdint.h>
-#include <string.h>
 
 #include <type_traits>
 

@@ -341,7 +341,8 @@ ZelStatus runLayer(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstSt
     return zelStatusOk;
   }
   // The destination of an expansion is wider than the state's tables.
-  uint8_t* tables = static_cast<uint8_t*>(alloc32(3 * dstRoi.width));
+  const int64_t words = 3 * int64_t(dstRoi.width);
+  uint8_t* tables = words > INT_MAX / 4 ? nullptr : static_cast<uint8_t*>(alloc32(int(words)));
   if (!tables) return zelStatusOutOfMemory;
   resample<T, kCh>(src, srcStep, srcRoi, dst, dstStep, dstRoi, st, false, reinterpret_cast<int32_t*>(tables),
                    reinterpret_cast<float*>(tables + 8 * size_t(dstRoi.width)));
