@@ -86,12 +86,30 @@ void envelopeRow(float* g, int w, const Envelope& e) {
   }
   if (k < 0) return;  // no feature anywhere: the row keeps the largest float
   e.start[k + 1] = HUGE_VAL;
+  // Squared distances below 2^24 are exact in single precision, and the
+  // single-precision root of such an integer is the float nearest to its
+  // exact root, so they take the vector root; larger ones the double one.
+  bool small = true;
   int j = 0;
   for (int x = 0; x < w; ++x) {
     while (e.start[j + 1] <= x) ++j;
-    const double dx = double(x - e.site[j]);
-    g[x] = float(sqrt(dx * dx + e.height[j]));
+    const double dx = double(x - e.site[j]), d2 = dx * dx + e.height[j];
+    small &= d2 < 16777216.0;
+    g[x] = small ? float(d2) : float(sqrt(d2));
+    if (!small) {
+      // Redo the roots of the values already stored as squares.
+      for (int i = 0; i < x; ++i) g[i] = sqrtf(g[i]);
+      for (++x; x < w; ++x) {
+        while (e.start[j + 1] <= x) ++j;
+        const double ex = double(x - e.site[j]);
+        g[x] = float(sqrt(ex * ex + e.height[j]));
+      }
+      return;
+    }
   }
+  int x = 0;
+  for (; x + 4 <= w; x += 4) _mm_storeu_ps(g + x, _mm_sqrt_ps(_mm_loadu_ps(g + x)));
+  for (; x < w; ++x) g[x] = sqrtf(g[x]);
 }
 
 }  // namespace

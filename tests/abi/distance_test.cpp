@@ -358,6 +358,25 @@ TEST(TrueDistance, ExactEuclideanDistances) {
   }
 }
 
+// Squares past 2^24 take the double-precision root.
+TEST(TrueDistance, LongDistances) {
+  std::mt19937 rng(707);
+  for (auto dims : {std::pair<int, int>{3, 4300}, {4200, 2}}) {
+    const int w = dims.first, h = dims.second;
+    TestImage<uint8_t> src({w, h, 1, 0, 0});
+    for (int y = 0; y < h; ++y) std::memset(src.row(y), 1, size_t(w));
+    src.at(0, 0) = 0;
+    int size = 0;
+    ASSERT_EQ(zeliTrueDistanceTransformGetBufferSize_8u32f_C1R({w, h}, &size), 0);
+    std::vector<Zel8u> buffer(static_cast<size_t>(size));
+    TestImage<Zel32f> dst(exactLayout(rng, w, h, 4, false));
+    ASSERT_EQ(zeliTrueDistanceTransform_8u32f_C1R(src.data(), src.step(), dst.data(), dst.step(), {w, h}, buffer.data()), 0);
+    const std::vector<int64_t> d2 = zeltest::squaredDistances(src);
+    EXPECT_TRUE(sameBits(dst, [&](int x, int y) { return float(std::sqrt(double(d2[size_t(y) * w + x]))); }));
+    EXPECT_TRUE(dst.sentinelIntact());
+  }
+}
+
 TEST(TrueDistance, ChecksInOrder) {
   TestImage<uint8_t> src({8, 4, 1, 0, 0});
   TestImage<Zel32f> dst({8, 4, 1, 0, 0});
