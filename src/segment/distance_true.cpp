@@ -49,19 +49,23 @@ void columnsDown(const uint8_t* s, const float* above, float* out, int w) {
   for (; x < w; ++x) out[x] = s[x] == 0 ? 0.0f : above[x] + 1.0f;
 }
 
-// Bottom to top: the smaller of the pixel's value and the row below + 1.
-void columnsUp(const float* below, float* out, int w) {
+// Bottom to top: the smaller of the pixel's value and the row below + 1,
+// kept in `below` too for the next row up.
+void columnsUp(float* below, float* out, int w) {
   const __m128 one = _mm_set1_ps(1.0f);
   int x = 0;
-  for (; x + 4 <= w; x += 4)
-    _mm_storeu_ps(out + x, _mm_min_ps(_mm_loadu_ps(out + x), _mm_add_ps(_mm_loadu_ps(below + x), one)));
-  for (; x < w; ++x) out[x] = std::min(out[x], below[x] + 1.0f);
+  for (; x + 4 <= w; x += 4) {
+    const __m128 v = _mm_min_ps(_mm_loadu_ps(out + x), _mm_add_ps(_mm_loadu_ps(below + x), one));
+    _mm_storeu_ps(out + x, v);
+    _mm_storeu_ps(below + x, v);
+  }
+  for (; x < w; ++x) out[x] = below[x] = std::min(out[x], below[x] + 1.0f);
 }
 
 struct Envelope {
-  int32_t* site;   // column of each parabola
-  double* height;  // its g^2
-  double* start;   // where it starts to be the lowest; one more entry than parabolas
+  int32_t* site;       // column of each parabola
+  float* g;            // its column distance
+  double* start;       // where it starts to be the lowest; one more entry than parabolas
 };
 
 // One row: on entry `g` holds the column distances, on return the distances.
@@ -69,19 +73,18 @@ void envelopeRow(float* g, int w, const Envelope& e) {
   int k = -1;
   for (int q = 0; q < w; ++q) {
     if (g[q] == FLT_MAX) continue;  // no feature in this column
-    const double gq = double(g[q]) * g[q];
-    const double fq = gq + double(q) * q;
+    const double fq = double(g[q]) * g[q] + double(q) * q;
     double s = -HUGE_VAL;
     while (k >= 0) {
       const int p = e.site[k];
-      s = (fq - (e.height[k] + double(p) * p)) / (2.0 * (q - p));
+      s = (fq - (double(e.g[k]) * e.g[k] + double(p) * p)) / (2.0 * (q - p));
       if (s > e.start[k]) break;
       --k;
       s = -HUGE_VAL;
     }
     ++k;
     e.site[k] = q;
-    e.height[k] = gq;
+    e.g[k] = g[q];
     e.start[k] = s;
   }
   if (k < 0) return;  // no feature anywhere: the row keeps the largest float
@@ -93,7 +96,7 @@ void envelopeRow(float* g, int w, const Envelope& e) {
   int j = 0;
   for (int x = 0; x < w; ++x) {
     while (e.start[j + 1] <= x) ++j;
-    const double dx = double(x - e.site[j]), d2 = dx * dx + e.height[j];
+    const double dx = double(x - e.site[j]), d2 = dx * dx + double(e.g[j]) * e.g[j];
     small &= d2 < 16777216.0;
     g[x] = small ? float(d2) : float(sqrt(d2));
     if (!small) {
@@ -102,7 +105,7 @@ void envelopeRow(float* g, int w, const Envelope& e) {
       for (++x; x < w; ++x) {
         while (e.start[j + 1] <= x) ++j;
         const double ex = double(x - e.site[j]);
-        g[x] = float(sqrt(ex * ex + e.height[j]));
+        g[x] = float(sqrt(ex * ex + double(e.g[j]) * e.g[j]));
       }
       return;
     }
@@ -130,22 +133,29 @@ ZELCV_ENTRY(zeliTrueDistanceTransform_8u32f_C1R)(const Zel8u* src, int srcStep, 
   if (ZelStatus s = checkImages({image(src, srcStep), image(dst, dstStep)}, roiSize, {buffer})) return s;
   const int w = roiSize.width, h = roiSize.height;
   const int64_t n = std::max(alignSize(w, 4), alignSize(h, 4));
-  // Buffer: the row of largest floats above the image (4n bytes), then the
-  // envelope's sites (4n), heights (8n) and starts (8n + 8), from an 8-byte
-  // boundary.
+  // Buffer, from an 8-byte boundary: a row of column distances (4n bytes),
+  // first the row of largest floats above the image, then a copy of the row
+  // below for the upward column pass; the envelope's sites (4n), column
+  // distances (4n) and breakpoints (8n + 8).
   uint8_t* p = alignUp(buffer, 8);
-  float* none = reinterpret_cast<float*>(p);
-  const Envelope e = {reinterpret_cast<int32_t*>(p + 4 * n), reinterpret_cast<double*>(p + 8 * n),
+  float* line = reinterpret_cast<float*>(p);
+  const Envelope e = {reinterpret_cast<int32_t*>(p + 4 * n), reinterpret_cast<float*>(p + 8 * n),
                       reinterpret_cast<double*>(p + 16 * n)};
-  for (int x = 0; x < w; ++x) none[x] = FLT_MAX;
+  for (int x = 0; x < w; ++x) line[x] = FLT_MAX;
 
-  const float* above = none;
+  const float* above = line;
   for (int y = 0; y < h; ++y) {
     float* out = rowOf(dst, dstStep, y);
     columnsDown(src + int64_t(srcStep) * y, above, out, w);
     above = out;
   }
-  for (int y = h - 2; y >= 0; --y) columnsUp(rowOf(dst, dstStep, y + 1), rowOf(dst, dstStep, y), w);
-  for (int y = 0; y < h; ++y) envelopeRow(rowOf(dst, dstStep, y), w, e);
+  // Upwards, each row finished while it is still in the cache.
+  memcpy(line, rowOf(dst, dstStep, h - 1), sizeof(float) * size_t(w));
+  envelopeRow(rowOf(dst, dstStep, h - 1), w, e);
+  for (int y = h - 2; y >= 0; --y) {
+    float* out = rowOf(dst, dstStep, y);
+    columnsUp(line, out, w);
+    envelopeRow(out, w, e);
+  }
   return zelStatusOk;
 }
