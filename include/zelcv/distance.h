@@ -82,15 +82,16 @@ ZELCV_API ZelStatus ZELCV_CALL zeliDistanceTransform_5x5_8u32f_C1R(const Zel8u* 
                                                                    int dstStep, ZeliSize roiSize,
                                                                    const Zel32f* metrics);
 
-/* Exact Euclidean transform: every result is the single-precision value
- * nearest to sqrt(dx^2 + dy^2) for the nearest feature pixel (the square root
- * taken in double precision of the exact integer, then rounded to float).
+/* Exact Euclidean transform: every result is sqrt(dx^2 + dy^2) for the
+ * nearest feature pixel, rounded to single precision (correctly rounded while
+ * dx^2 + dy^2 < 2^24; above, the double-precision root rounded to float).
  * An image without any 0 pixel gives the largest finite float everywhere.
  * Buffer: 24 max(align4(width), align4(height)) + 56 bytes, align4 rounding
  * up to a multiple of 4; the query gives -8 for a null output, -6 for a
- * width or height below 1. Checks: null src, dst or buffer -8; width or
- * height < 1 -6; srcStep < width, dstStep < 4 width -14; dstStep not a
- * multiple of 4 -108. */
+ * width or height below 1 or a size above INT_MAX bytes.
+ * Checks: null src, dst or buffer -8; width or height < 1 -6; srcStep <
+ * width, dstStep < 4 width -14; dstStep not a multiple of 4 -108; a ROI
+ * whose buffer size the query refuses -6. */
 ZELCV_API ZelStatus ZELCV_CALL zeliTrueDistanceTransformGetBufferSize_8u32f_C1R(ZeliSize roiSize,
                                                                                 int* bufferSize);
 ZELCV_API ZelStatus ZELCV_CALL zeliTrueDistanceTransform_8u32f_C1R(const Zel8u* src, int srcStep, Zel32f* dst,
@@ -116,9 +117,11 @@ ZELCV_API ZelStatus ZELCV_CALL zeliTrueDistanceTransform_8u32f_C1R(const Zel8u* 
  * in [-r, r]; with r = 0 the start values are the result (-r being -0.0).
  * Buffer: (height + 34) x (align32(width) OR 5) + 40 bytes, align32 rounding
  * up to a multiple of 32 and OR the bitwise or (not a sum); the query gives
- * -8 for a null output, -6 for a width or height below 1. Checks: null src,
- * dst or buffer -8; width or height < 1 -6; srcStep < width, dstStep <
- * 4 width -14; dstStep not a multiple of 4 -108; radius < 0 (or NaN) -5. */
+ * -8 for a null output, -6 for a width or height below 1 or a size above
+ * INT_MAX bytes.
+ * Checks: null src, dst or buffer -8; width or height < 1 -6; srcStep <
+ * width, dstStep < 4 width -14; dstStep not a multiple of 4 -108; a ROI
+ * whose buffer size the query refuses -6; radius < 0 (or NaN) -5. */
 ZELCV_API ZelStatus ZELCV_CALL zeliFastMarchingGetBufferSize_8u32f_C1R(ZeliSize roiSize, int* bufferSize);
 ZELCV_API ZelStatus ZELCV_CALL zeliFastMarching_8u32f_C1R(const Zel8u* src, int srcStep, Zel32f* dst,
                                                           int dstStep, ZeliSize roiSize, Zel32f radius,

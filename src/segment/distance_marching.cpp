@@ -79,6 +79,8 @@ ZELCV_ENTRY(zeliFastMarchingGetBufferSize_8u32f_C1R)(ZeliSize roiSize, int* buff
 ZELCV_ENTRY(zeliFastMarching_8u32f_C1R)(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep,
                                         ZeliSize roiSize, Zel32f radius, Zel8u* buffer) {
   if (ZelStatus s = checkImages({image(src, srcStep), image(dst, dstStep)}, roiSize, {buffer})) return s;
+  // No buffer can serve a size that the query refuses.
+  if (marchingBufferBytes(roiSize) > INT32_MAX) return zelStatusBadSize;
   if (!(radius >= 0.0f)) return zelStatusBadArgument;
   const int w = roiSize.width, h = roiSize.height;
   // The buffer holds one byte per pixel, rows packed: 1 for a 0 source pixel.

@@ -131,6 +131,8 @@ ZELCV_ENTRY(zeliTrueDistanceTransformGetBufferSize_8u32f_C1R)(ZeliSize roiSize, 
 ZELCV_ENTRY(zeliTrueDistanceTransform_8u32f_C1R)(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep,
                                                  ZeliSize roiSize, Zel8u* buffer) {
   if (ZelStatus s = checkImages({image(src, srcStep), image(dst, dstStep)}, roiSize, {buffer})) return s;
+  // No buffer can serve a size that the query refuses.
+  if (trueBufferBytes(roiSize) > INT32_MAX) return zelStatusBadSize;
   const int w = roiSize.width, h = roiSize.height;
   const int64_t n = std::max(alignSize(w, 4), alignSize(h, 4));
   // Buffer, from an 8-byte boundary: a row of column distances (4n bytes),
