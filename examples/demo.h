@@ -31,5 +31,6 @@ int demoMorph(const DemoImage* image, const char* outDir);
 int demoMorphAdv(const DemoImage* image, const char* outDir);
 int demoFloodFill(const DemoImage* image, const char* outDir);
 int demoPyramid(const DemoImage* image, const char* outDir);
+int demoDistance(const DemoImage* image, const char* outDir);
 
 #endif

@@ -35,6 +35,7 @@ int main(int argc, char** argv) {
   failures |= demoMorphAdv(&image, outDir);
   failures |= demoFloodFill(&image, outDir);
   failures |= demoPyramid(&image, outDir);
+  failures |= demoDistance(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

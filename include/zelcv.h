@@ -19,5 +19,6 @@
 #include "zelcv/integral.h"
 #include "zelcv/floodfill.h"
 #include "zelcv/pyramid.h"
+#include "zelcv/distance.h"
 
 #endif /* ZELCV_H */
