@@ -32,5 +32,6 @@ int demoMorphAdv(const DemoImage* image, const char* outDir);
 int demoFloodFill(const DemoImage* image, const char* outDir);
 int demoPyramid(const DemoImage* image, const char* outDir);
 int demoDistance(const DemoImage* image, const char* outDir);
+int demoFilters(const DemoImage* image, const char* outDir);
 
 #endif

@@ -36,6 +36,7 @@ int main(int argc, char** argv) {
   failures |= demoFloodFill(&image, outDir);
   failures |= demoPyramid(&image, outDir);
   failures |= demoDistance(&image, outDir);
+  failures |= demoFilters(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

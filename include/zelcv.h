@@ -20,5 +20,6 @@
 #include "zelcv/floodfill.h"
 #include "zelcv/pyramid.h"
 #include "zelcv/distance.h"
+#include "zelcv/filters.h"
 
 #endif /* ZELCV_H */

@@ -1,8 +1,8 @@
-// First-derivative filters of 8-bit images (3x3 Sobel, 3x3 Scharr, 5x5
-// Sobel), produced one output row at a time so that a caller can consume the
-// derivatives while they are still in the first-level cache. The Canny
-// detector streams through them; the exported derivative filters build on the
-// same rows.
+// Both first derivatives of 8-bit images (3x3 Sobel, 3x3 Scharr, 5x5 Sobel),
+// produced one output row at a time so that a caller can consume them while
+// they are still in the first-level cache. The Canny detector streams through
+// them. They run on the integer engine of the exported derivative filters
+// (derivative_kernels.h), with the same taps, so both give the same values.
 #ifndef ZELCV_FILTER_DERIVATIVE_H
 #define ZELCV_FILTER_DERIVATIVE_H
 
@@ -45,8 +45,6 @@ class DerivativeRows {
   void row(int y, Zel16s* dx, Zel16s* dy) const;
 
  private:
-  const Zel8u* sourceRow(int y) const;
-
   const Zel8u* src_;
   int srcStep_;
   ZeliSize roi_;
