@@ -17,5 +17,6 @@
 #include "zelcv/morphology.h"
 #include "zelcv/morph_adv.h"
 #include "zelcv/integral.h"
+#include "zelcv/statistics.h"
 
 #endif /* ZELCV_H */
