@@ -29,5 +29,6 @@ int demoArith(const DemoImage* image, const char* outDir);
 int demoFilter(const DemoImage* image, const char* outDir);
 int demoMorph(const DemoImage* image, const char* outDir);
 int demoMorphAdv(const DemoImage* image, const char* outDir);
+int demoStatistics(const DemoImage* image, const char* outDir);
 
 #endif

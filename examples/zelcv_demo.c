@@ -33,6 +33,7 @@ int main(int argc, char** argv) {
   failures |= demoFilter(&image, outDir);
   failures |= demoMorph(&image, outDir);
   failures |= demoMorphAdv(&image, outDir);
+  failures |= demoStatistics(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }
