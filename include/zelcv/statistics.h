@@ -23,10 +23,10 @@ extern "C" {
  *   2^32 pixels, 16u squares included); the sum is rounded once to double.
  *   32f data: the difference x1 - x2 is taken in single precision; values
  *   are widened to double (squares of them are then exact) and summed in
- *   double precision over eight lanes: lane k takes, in raster order, the
- *   pixels of the columns x with x mod 8 == k, and the total is
- *   ((l0 + l4) + (l2 + l6)) + ((l1 + l5) + (l3 + l7)). Every instruction
- *   set gives these bits. A NaN pixel makes a sum NaN; the infinity norm
+ *   double precision over sixteen lanes: lane k takes, in raster order, the
+ *   pixels of the columns x with x mod 16 == k; with t_k = l_k + l_(k+8)
+ *   the total is ((t0 + t4) + (t2 + t6)) + ((t1 + t5) + (t3 + t7)). Every
+ *   instruction set gives these bits. A NaN pixel makes a sum NaN; the infinity norm
  *   skips NaNs.
  * Results.
  *   Norm_Inf: max |x|; Norm_L1: sum |x|; Norm_L2: sqrt(sum x^2) (double

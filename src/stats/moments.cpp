@@ -15,7 +15,7 @@ ZelStatus mean(const T* src, int srcStep, const uint8_t* mask, int maskStep, Zel
   if (ZelStatus st = checkStat(src, srcStep, none, 0, mask, maskStep, false, kMask, roi, coi, kCoi, {out}))
     return st;
   Acc<T> acc;
-  reduce<Kind::Sum, false, kMask>(sourceOf(src, srcStep, none, 0, mask, maskStep, roi, coi, kCoi), acc);
+  reduceChosen<Kind::Sum, false, kMask>(sourceOf(src, srcStep, none, 0, mask, maskStep, roi, coi, kCoi), acc);
   *out = acc.count ? acc.plainSum() / double(acc.count) : 0.0;
   return zelStatusOk;
 }
@@ -30,7 +30,7 @@ ZelStatus meanStdDev(const T* src, int srcStep, const uint8_t* mask, int maskSte
           checkStat(src, srcStep, none, 0, mask, maskStep, false, kMask, roi, coi, kCoi, {mean, stdDev}))
     return st;
   Acc<T> acc;
-  reduce<Kind::SumSq, false, kMask>(sourceOf(src, srcStep, none, 0, mask, maskStep, roi, coi, kCoi), acc);
+  reduceChosen<Kind::SumSq, false, kMask>(sourceOf(src, srcStep, none, 0, mask, maskStep, roi, coi, kCoi), acc);
   if (acc.count == 0) {
     *mean = 0.0;
     *stdDev = 0.0;

@@ -14,7 +14,7 @@ namespace {
 template <Kind K, bool kTwo, bool kMask, typename T>
 double normOf(const Source<T>& s) {
   Acc<T> acc;
-  reduce<K, kTwo, kMask>(s, acc);
+  reduceChosen<K, kTwo, kMask>(s, acc);
   const double t = acc.total(K);
   return K == Kind::L2 ? std::sqrt(t) : t;
 }

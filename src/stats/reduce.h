@@ -7,10 +7,11 @@
 // bits.
 //
 // Integer data is summed exactly in 64-bit integers. 32f data is summed in
-// double precision over eight lanes: lane k takes, in raster order, the
-// pixels whose column x has x mod 8 == k; the total is
-// ((l0 + l4) + (l2 + l6)) + ((l1 + l5) + (l3 + l7)). Squares of single-
-// precision values are exact in double precision.
+// double precision over sixteen lanes: lane k takes, in raster order, the
+// pixels whose column x has x mod 16 == k; with t_k = l_k + l_(k+8), the
+// total is ((t0 + t4) + (t2 + t6)) + ((t1 + t5) + (t3 + t7)). Sixteen
+// independent chains keep the additions' latency hidden at any vector
+// width. Squares of single-precision values are exact in double precision.
 #ifndef ZELCV_STATS_REDUCE_H
 #define ZELCV_STATS_REDUCE_H
 
@@ -20,6 +21,8 @@
 #include <cmath>
 #include <limits>
 #include <type_traits>
+
+#include "kernels/simd.h"
 
 namespace zelcv {
 namespace stats {
@@ -50,7 +53,7 @@ struct Source {
 
 enum class Kind { Inf, L1, L2, Sum, SumSq };
 
-constexpr int kLanes = 8;
+constexpr int kLanes = 16;
 
 // The running sums of one statistic. Integer data: exact 64-bit sums; 32f:
 // eight double lanes.
@@ -73,7 +76,11 @@ struct Acc {
   double squares() const { return double(sumSq); }
 };
 
-inline double reduceLanes(const double* l) { return ((l[0] + l[4]) + (l[2] + l[6])) + ((l[1] + l[5]) + (l[3] + l[7])); }
+inline double reduceLanes(const double* l) {
+  double t[8];
+  for (int k = 0; k < 8; ++k) t[k] = l[k] + l[k + 8];
+  return ((t[0] + t[4]) + (t[2] + t[6])) + ((t[1] + t[5]) + (t[3] + t[7]));
+}
 
 template <typename T>
 struct Acc<T, true> {
@@ -121,12 +128,12 @@ inline void scalarRow(Acc<T>& acc, const T* a, const T* b, const uint8_t* m, int
           if (m2 > acc.maxAbs) acc.maxAbs = m2;
           break;
         }
-        case Kind::L1: acc.lane[x & 7] += std::fabs(d); break;
-        case Kind::L2: acc.sq[x & 7] += d * d; break;
-        case Kind::Sum: acc.lane[x & 7] += d; break;
+        case Kind::L1: acc.lane[x & 15] += std::fabs(d); break;
+        case Kind::L2: acc.sq[x & 15] += d * d; break;
+        case Kind::Sum: acc.lane[x & 15] += d; break;
         case Kind::SumSq:
-          acc.lane[x & 7] += d;
-          acc.sq[x & 7] += d * d;
+          acc.lane[x & 15] += d;
+          acc.sq[x & 15] += d * d;
           break;
       }
     } else {
@@ -153,9 +160,10 @@ inline void scalarRow(Acc<T>& acc, const T* a, const T* b, const uint8_t* m, int
   }
 }
 
-// The SSE2 rows (reduce_sse2.h): they handle the columns [0, return value)
-// and leave the rest to scalarRow. The generic form handles none.
-template <Kind K, bool kTwo, bool kMask, typename T>
+// The vector rows (reduce_sse2.h; the AVX2 ones in reduce_avx2.cpp): they
+// handle the columns [0, return value) and leave the rest to scalarRow. The
+// generic form handles none.
+template <Kind K, bool kTwo, bool kMask, typename T, typename Isa>
 struct VectorRow {
   static int run(Acc<T>&, const T*, const T*, const uint8_t*, int) { return 0; }
 };
@@ -169,14 +177,14 @@ namespace zelcv {
 namespace stats {
 
 // The one loop over the rows of every reduction.
-template <Kind K, bool kTwo, bool kMask, typename T>
+template <Kind K, bool kTwo, bool kMask, typename Isa, typename T>
 void reduce(const Source<T>& s, Acc<T>& acc) {
   for (int y = 0; y < s.height; ++y) {
     const T* a = s.rowA(y);
     const T* b = kTwo ? s.rowB(y) : nullptr;
     const uint8_t* m = kMask ? s.rowMask(y) : nullptr;
     int x = 0;
-    if (s.stride == 1) x = VectorRow<K, kTwo, kMask, T>::run(acc, a, b, m, s.width);
+    if (s.stride == 1) x = VectorRow<K, kTwo, kMask, T, Isa>::run(acc, a, b, m, s.width);
     scalarRow<K, kTwo, kMask>(acc, a, b, m, x, s.width, s.stride);
   }
   if (!kMask && (K == Kind::Sum || K == Kind::SumSq)) acc.count = uint64_t(s.width) * uint64_t(s.height);

@@ -9,6 +9,7 @@
 #include <initializer_list>
 
 #include "core/status.h"
+#include "kernels/dispatch.h"
 #include "stats/reduce.h"
 
 namespace zelcv {
@@ -41,6 +42,13 @@ Source<T> sourceOf(const T* a, int aStep, const T* b, int bStep, const uint8_t* 
                    int coi, bool hasCoi) {
   const int offset = hasCoi ? coi - 1 : 0;
   return {a + offset, aStep, b ? b + offset : nullptr, bStep, mask, maskStep, hasCoi ? 3 : 1, roi.width, roi.height};
+}
+
+// A reduction on the widest rows the processor allows; every choice gives
+// the same bits.
+template <Kind K, bool kTwo, bool kMask, typename T>
+void reduceChosen(const Source<T>& s, Acc<T>& acc) {
+  withChosenIsa<IsaLevel::Avx2>([&](auto isa) { reduce<K, kTwo, kMask, typename decltype(isa)::Isa>(s, acc); });
 }
 
 }  // namespace stats

@@ -114,13 +114,20 @@ void copyWindow(const S* src, int srcStep, ZeliSize srcSize, D* dst, int dstStep
     };
     int i = 0;
     for (; i < lo; ++i) replicated(i);
-    for (; i + 4 <= hi; i += 4) {
-      const S* a0 = s0 + (p.ix + i);
-      const S* a1 = s1 + (p.ix + i);
+    auto four = [&](int at) {
+      const S* a0 = s0 + (p.ix + at);
+      const S* a1 = s1 + (p.ix + at);
       __m128 v = _mm_add_ps(_mm_mul_ps(load4(a0), w00), _mm_mul_ps(load4(a0 + 1), w01));
       v = _mm_add_ps(v, _mm_mul_ps(load4(a1), w10));
       v = _mm_add_ps(v, _mm_mul_ps(load4(a1 + 1), w11));
-      put4(d + i, v);
+      put4(d + at, v);
+    };
+    for (; i + 4 <= hi; i += 4) four(i);
+    // A ragged end of four or more columns: the last four again, overlapping
+    // columns already written with the same values.
+    if (i < hi && hi - lo >= 4) {
+      four(hi - 4);
+      i = hi;
     }
     for (; i < hi; ++i) {
       const S* a0 = s0 + (p.ix + i);

@@ -1,6 +1,6 @@
 // The masked statistics straight from their definitions: a raster walk over
 // the selected pixels of one channel, exact 64-bit sums for integer data and
-// the eight column lanes of double sums for 32f data. Nothing here follows
+// the sixteen column lanes of double sums for 32f data. Nothing here follows
 // the library's row splitting or vector blocks.
 #ifndef ZELCV_TESTS_STATISTICS_REFERENCE_H
 #define ZELCV_TESTS_STATISTICS_REFERENCE_H
@@ -23,7 +23,12 @@ struct StatResults {
   ZeliPoint minAt, maxAt;
 };
 
-inline double laneTotal(const double* l) { return ((l[0] + l[4]) + (l[2] + l[6])) + ((l[1] + l[5]) + (l[3] + l[7])); }
+// Sixteen lanes by column mod 16, folded in halves: t_k = l_k + l_(k+8).
+inline double laneTotal(const double* l) {
+  double t[8];
+  for (int k = 0; k < 8; ++k) t[k] = l[k] + l[k + 8];
+  return ((t[0] + t[4]) + (t[2] + t[6])) + ((t[1] + t[5]) + (t[3] + t[7]));
+}
 
 // Statistics of channel `channel` of a and b where mask (or every pixel when
 // null) selects.
@@ -34,10 +39,10 @@ StatResults referenceStats(const TestImage<T>& a, const TestImage<T>& b, const T
   StatResults r{};
   uint64_t maxAbs[3] = {}, sumAbs[3] = {}, sumSq[3] = {};
   float fmax[3] = {};
-  double lanes[3][8] = {}, squares[3][8] = {};
+  double lanes[3][16] = {}, squares[3][16] = {};
   int64_t sum = 0;
   uint64_t q = 0, n = 0;
-  double meanLanes[8] = {}, meanSquares[8] = {};
+  double meanLanes[16] = {}, meanSquares[16] = {};
   bool found = false;
   T lo = T(0), hi = T(0);
   r.minAt = r.maxAt = {-1, -1};
@@ -51,11 +56,11 @@ StatResults referenceStats(const TestImage<T>& a, const TestImage<T>& b, const T
         for (int k = 0; k < 3; ++k) {
           const double d = vals[k];
           if (std::fabs(vals[k]) > fmax[k]) fmax[k] = std::fabs(vals[k]);
-          lanes[k][x % 8] += std::fabs(d);
-          squares[k][x % 8] += d * d;
+          lanes[k][x % 16] += std::fabs(d);
+          squares[k][x % 16] += d * d;
         }
-        meanLanes[x % 8] += double(va);
-        meanSquares[x % 8] += double(va) * double(va);
+        meanLanes[x % 16] += double(va);
+        meanSquares[x % 16] += double(va) * double(va);
       } else {
         const int64_t vals[3] = {int64_t(va), int64_t(va) - int64_t(vb), int64_t(vb)};
         for (int k = 0; k < 3; ++k) {
