@@ -11,6 +11,7 @@
 
 #include <cmath>
 
+#include "core/load.h"
 #include "core/status.h"
 
 namespace zelcv {
@@ -98,6 +99,7 @@ ZeliRect insideRect(const Placement& p, ZeliSize source, ZeliSize window) {
 template <typename S, typename D>
 void copyWindow(const S* src, int srcStep, ZeliSize srcSize, D* dst, int dstStep, ZeliSize window,
                 const Placement& p) {
+  const bool wide = useAvx2Kernels();
   const int64_t W = srcSize.width, H = srcSize.height;
   // Columns [lo, hi) have both taps inside the source.
   const int lo = int(clampTo(-p.ix, 0, window.width));
@@ -122,6 +124,10 @@ void copyWindow(const S* src, int srcStep, ZeliSize srcSize, D* dst, int dstStep
       v = _mm_add_ps(v, _mm_mul_ps(load4(a1 + 1), w11));
       put4(d + at, v);
     };
+    if (wide && hi - lo >= 8) {
+      avx2::subpixInterior(s0 + (p.ix + lo), s1 + (p.ix + lo), d + lo, 0, hi - lo, p);
+      i = hi;
+    }
     for (; i + 4 <= hi; i += 4) four(i);
     // A ragged end of four or more columns: the last four again, overlapping
     // columns already written with the same values.

@@ -35,6 +35,17 @@ void copyWindow(const S* src, int srcStep, ZeliSize srcSize, D* dst, int dstStep
                 const Placement& p);
 
 }  // namespace subpix
+
+// The AVX2 part of a row: columns [lo, hi) of one window row, eight at a
+// time (the last eight overlapping), from row pointers a0 and a1 at column
+// ix; the same bits as the SSE2 part. Only rows of eight or more such
+// columns come here. Defined in subpix_avx2.cpp.
+namespace avx2 {
+void subpixInterior(const uint8_t* a0, const uint8_t* a1, uint8_t* d, int lo, int hi, const subpix::Placement& p);
+void subpixInterior(const uint8_t* a0, const uint8_t* a1, float* d, int lo, int hi, const subpix::Placement& p);
+void subpixInterior(const uint16_t* a0, const uint16_t* a1, float* d, int lo, int hi, const subpix::Placement& p);
+void subpixInterior(const float* a0, const float* a1, float* d, int lo, int hi, const subpix::Placement& p);
+}  // namespace avx2
 }  // namespace zelcv
 
 #endif  // ZELCV_STATS_SUBPIX_H
