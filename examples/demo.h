@@ -33,5 +33,6 @@ int demoFloodFill(const DemoImage* image, const char* outDir);
 int demoPyramid(const DemoImage* image, const char* outDir);
 int demoDistance(const DemoImage* image, const char* outDir);
 int demoFilters(const DemoImage* image, const char* outDir);
+int demoStatistics(const DemoImage* image, const char* outDir);
 
 #endif

@@ -37,6 +37,7 @@ int main(int argc, char** argv) {
   failures |= demoPyramid(&image, outDir);
   failures |= demoDistance(&image, outDir);
   failures |= demoFilters(&image, outDir);
+  failures |= demoStatistics(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

@@ -21,5 +21,6 @@
 #include "zelcv/pyramid.h"
 #include "zelcv/distance.h"
 #include "zelcv/filters.h"
+#include "zelcv/statistics.h"
 
 #endif /* ZELCV_H */

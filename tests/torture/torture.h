@@ -38,9 +38,12 @@ struct ParamInfo {
 };
 
 // Size of an arithmetic element; 0 for anything else (opaque states too).
+// Points and rectangles count as arrays of their 32-bit fields (arr=2 for
+// one ZeliPoint, arr=4 for one ZeliRect).
 template <typename P>
 constexpr int elementSize() {
   if constexpr (std::is_arithmetic<P>::value) return int(sizeof(P));
+  else if constexpr (std::is_same<P, ZeliPoint>::value || std::is_same<P, ZeliRect>::value) return 4;
   else return 0;
 }
 
@@ -56,7 +59,7 @@ ParamInfo paramInfo() {
     }
   } else if constexpr (std::is_same<T, ZeliSize>::value) {
     return {'S', 0, 0, false};
-  } else if constexpr (std::is_same<T, ZeliPoint>::value) {
+  } else if constexpr (std::is_same<T, ZeliPoint>::value || std::is_same<T, ZeliPoint_32f>::value) {
     return {'P', 0, 0, false};
   } else if constexpr (std::is_same<T, ZeliRect>::value) {
     return {'R', 0, 0, false};
@@ -76,6 +79,8 @@ T argument(const Value& v) {
     return v.size;
   } else if constexpr (std::is_same<T, ZeliPoint>::value) {
     return v.point;
+  } else if constexpr (std::is_same<T, ZeliPoint_32f>::value) {
+    return ZeliPoint_32f{float(v.point.x), float(v.point.y)};
   } else if constexpr (std::is_same<T, ZeliRect>::value) {
     return v.rect;
   } else if constexpr (std::is_floating_point<T>::value) {
