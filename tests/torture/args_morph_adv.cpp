@@ -1,6 +1,8 @@
 // Torture table: compound morphology. States from a 3 x 3 element for the
 // ROI of the images; a wider ROI or a height whose intermediate image cannot
 // fit gives -6 (roi:W:H), whatever the border.
+#include <cstring>
+
 #include "torture/torture.h"
 
 namespace {
@@ -10,13 +12,21 @@ Zel8u kSquare[9] = {1, 1, 1, 1, 1, 1, 1, 1, 1};
 using GetSize = ZelStatus(ZELCV_CALL*)(ZeliSize, ZeliSize, int*, int*);
 using Init = ZelStatus(ZELCV_CALL*)(ZeliSize, Zel8u*, ZeliSize, ZeliMorphAdvState*, Zel8u*);
 
+// Init reflects the caller's mask in place while it works, so threads that
+// build states at once each need their own copy.
+Zel8u* ownMask(zeltorture::Arena& a) {
+  auto* mask = static_cast<Zel8u*>(a.block(sizeof kSquare));
+  std::memcpy(mask, kSquare, sizeof kSquare);
+  return mask;
+}
+
 zeltorture::Maker compound(GetSize getSize, Init init) {
   return {[=](zeltorture::Arena& a, ZeliSize roi) -> void* {
             int stateSize = 0, bufferSize = 0;
             if (getSize(roi, {3, 3}, &stateSize, &bufferSize)) return nullptr;
             auto* state = static_cast<ZeliMorphAdvState*>(a.block(size_t(stateSize)));
             auto* buffer = static_cast<Zel8u*>(a.block(size_t(bufferSize)));
-            return init(roi, kSquare, {3, 3}, state, buffer) ? nullptr : state;
+            return init(roi, ownMask(a), {3, 3}, state, buffer) ? nullptr : state;
           },
           nullptr};
 }
@@ -28,9 +38,9 @@ MAKER(8u_C1R); MAKER(8u_C3R); MAKER(8u_C4R); MAKER(32f_C1R); MAKER(32f_C3R); MAK
 MAKER(16u_C1R); MAKER(16s_C1R); MAKER(1u_C1R);
 
 TORTURE_MAKER(morphadv,
-              [](zeltorture::Arena&, ZeliSize roi) -> void* {
+              [](zeltorture::Arena& a, ZeliSize roi) -> void* {
                 ZeliMorphAdvState* s = nullptr;
-                return zeliMorphAdvInitAlloc_8u_C1R(&s, roi, kSquare, {3, 3}, {1, 1}) ? nullptr : s;
+                return zeliMorphAdvInitAlloc_8u_C1R(&s, roi, ownMask(a), {3, 3}, {1, 1}) ? nullptr : s;
               },
               [](void* p) { zeliMorphAdvFree(static_cast<ZeliMorphAdvState*>(p)); });
 
