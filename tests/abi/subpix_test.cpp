@@ -254,7 +254,7 @@ TEST(FastArctan, VectorAndScalarAgreeWithinTheBound) {
         EXPECT_EQ(out[i], 0.0f);
         continue;
       }
-      double exact = std::atan2(double(y[i]), double(x[i])) * 180.0 / M_PI;
+      double exact = std::atan2(double(y[i]), double(x[i])) * (180.0 / 3.14159265358979323846);
       if (exact < 0) exact += 360.0;
       double err = std::fabs(out[i] - exact);
       err = std::min(err, 360.0 - err);
