@@ -1,5 +1,6 @@
 // Flood fill: the argument checks, the buffer layouts and the exports of the
 // plain, range and gradient criteria.
+#include <cstring>
 #include <limits.h>
 #include <stdint.h>
 
@@ -28,11 +29,15 @@ ZelStatus checkFill(const T* image, int step, ZeliSize roi, ZeliPoint seed,
   return zelStatusOk;
 }
 
+// The record is built aside and copied bytewise: the caller's record need
+// not sit at its natural alignment.
 template <typename T, int C>
 void writeRecord(ZeliConnectedComp* region, const Outcome& o, const T* nv) {
-  region->area = double(o.area);
-  for (int c = 0; c < 3; ++c) region->value[c] = c < C ? double(nv[c]) : 0.0;
-  region->rect = {o.left, o.top, o.right - o.left + 1, o.bottom - o.top + 1};
+  ZeliConnectedComp r;
+  r.area = double(o.area);
+  for (int c = 0; c < 3; ++c) r.value[c] = c < C ? double(nv[c]) : 0.0;
+  r.rect = {o.left, o.top, o.right - o.left + 1, o.bottom - o.top + 1};
+  std::memcpy(static_cast<void*>(region), &r, sizeof r);
 }
 
 template <typename T, int C>
