@@ -134,12 +134,12 @@ struct SobelCross {
 struct ScharrHoriz {
   using K3 = Kernel<First3, ScharrSmooth3>;
   using K5 = void;  // 3x3 only
-  static constexpr int kShift3 = 5, kShift5 = 0;
+  static constexpr int kShift3 = 5;
 };
 struct ScharrVert {
   using K3 = Kernel<ScharrSmooth3, First3>;
   using K5 = void;
-  static constexpr int kShift3 = 5, kShift5 = 0;
+  static constexpr int kShift3 = 5;
 };
 struct Laplacian {
   using K3 = Kernel<Smooth3, Second3, Second3, Smooth3>;
