@@ -132,8 +132,8 @@ void registerFilters() {
             int st = 0, bu = 0;
             const ZeliSize roi = zelbench::roiOf(src);
             zeliFilterGaussianGetBufferSize(roi, g.k, g.type, 1, &st, &bu);
-            std::vector<Zel8u> spec(static_cast<size_t>(st)), buffer(static_cast<size_t>(bu));
-            auto* state0 = reinterpret_cast<ZeliFilterGaussianSpec*>(spec.data());
+            std::vector<Zel8u> gaussian(static_cast<size_t>(st)), buffer(static_cast<size_t>(bu));
+            auto* state0 = reinterpret_cast<ZeliFilterGaussianState*>(gaussian.data());
             zeliFilterGaussianInit(roi, sigma, g.k, g.type, 1, state0);
             for (auto _ : state) {
               const ZelStatus r =

@@ -63,12 +63,12 @@ static int gaussianStep(const DemoImage* image, const char* outDir) {
   DemoImage out = demoAllocImage(image->width, image->height);
   int failures = 1;
   if (state && buffer && out.pixels) {
-    ZeliFilterGaussianSpec* spec = (ZeliFilterGaussianSpec*)state;
-    failures = demoCheck("zeliFilterGaussianInit", zeliFilterGaussianInit(roi, 2.0f, 9, zel8u, 1, spec));
+    ZeliFilterGaussianState* gaussian = (ZeliFilterGaussianState*)state;
+    failures = demoCheck("zeliFilterGaussianInit", zeliFilterGaussianInit(roi, 2.0f, 9, zel8u, 1, gaussian));
     if (!failures)
       failures = demoCheck("zeliFilterGaussianBorder_8u_C1R",
                            zeliFilterGaussianBorder_8u_C1R(image->pixels, image->step, out.pixels, out.step, roi,
-                                                           zelBorderMirror, 0, spec, buffer));
+                                                           zelBorderMirror, 0, gaussian, buffer));
     if (!failures) failures = demoWritePgm(outDir, "filters_gaussian.pgm", out.pixels, out.step, out.width, out.height);
   }
   free(state);

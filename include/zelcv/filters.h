@@ -96,7 +96,7 @@ extern "C" {
 
 /* A Gaussian filter's taps, built by zeliFilterGaussianInit in caller memory
  * of the size zeliFilterGaussianGetBufferSize reports (any alignment). */
-typedef struct ZeliFilterGaussianSpec ZeliFilterGaussianSpec;
+typedef struct ZeliFilterGaussianState ZeliFilterGaussianState;
 
 #define ZELCV_FILTER_8U(name, D)                                                                      \
   ZELCV_API ZelStatus ZELCV_CALL name(const Zel8u* src, int srcStep, D* dst, int dstStep, ZeliSize roiSize, \
@@ -180,31 +180,31 @@ ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianGetBufferSize(ZeliSize roiSize,
                                                                int channels, int* stateSize, int* bufferSize);
 ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianInit(ZeliSize roiSize, Zel32f sigma, int kernelSize,
                                                       ZelDataType dataType, int channels,
-                                                      ZeliFilterGaussianSpec* state);
+                                                      ZeliFilterGaussianState* state);
 ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianBorder_8u_C1R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
                                                                ZeliSize roiSize, ZeliBorderType borderType,
-                                                               Zel8u borderValue, const ZeliFilterGaussianSpec* state,
+                                                               Zel8u borderValue, const ZeliFilterGaussianState* state,
                                                                Zel8u* buffer);
 ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianBorder_8u_C3R(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep,
                                                                ZeliSize roiSize, ZeliBorderType borderType,
                                                                const Zel8u borderValue[3],
-                                                               const ZeliFilterGaussianSpec* state, Zel8u* buffer);
+                                                               const ZeliFilterGaussianState* state, Zel8u* buffer);
 ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianBorder_16u_C1R(const Zel16u* src, int srcStep, Zel16u* dst,
                                                                 int dstStep, ZeliSize roiSize,
                                                                 ZeliBorderType borderType, Zel16u borderValue,
-                                                                const ZeliFilterGaussianSpec* state, Zel8u* buffer);
+                                                                const ZeliFilterGaussianState* state, Zel8u* buffer);
 ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianBorder_16u_C3R(const Zel16u* src, int srcStep, Zel16u* dst,
                                                                 int dstStep, ZeliSize roiSize,
                                                                 ZeliBorderType borderType, const Zel16u borderValue[3],
-                                                                const ZeliFilterGaussianSpec* state, Zel8u* buffer);
+                                                                const ZeliFilterGaussianState* state, Zel8u* buffer);
 ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianBorder_32f_C1R(const Zel32f* src, int srcStep, Zel32f* dst,
                                                                 int dstStep, ZeliSize roiSize,
                                                                 ZeliBorderType borderType, Zel32f borderValue,
-                                                                const ZeliFilterGaussianSpec* state, Zel8u* buffer);
+                                                                const ZeliFilterGaussianState* state, Zel8u* buffer);
 ZELCV_API ZelStatus ZELCV_CALL zeliFilterGaussianBorder_32f_C3R(const Zel32f* src, int srcStep, Zel32f* dst,
                                                                 int dstStep, ZeliSize roiSize,
                                                                 ZeliBorderType borderType, const Zel32f borderValue[3],
-                                                                const ZeliFilterGaussianSpec* state, Zel8u* buffer);
+                                                                const ZeliFilterGaussianState* state, Zel8u* buffer);
 
 /* Sobel taps of derivative `order` and odd size kernelSize. */
 ZELCV_API ZelStatus ZELCV_CALL zeliGenSobelKernel_16s(Zel16s* kernel, int kernelSize, int order);

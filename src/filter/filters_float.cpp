@@ -327,12 +327,12 @@ template <> struct TypeCode<Zel32f> { static constexpr int value = zel32f; };
 
 template <typename T, int kChannels>
 ZelStatus gaussian(const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, ZeliBorderType border,
-                   const T* borderValue, const ZeliFilterGaussianSpec* spec, Zel8u* buffer) {
+                   const T* borderValue, const ZeliFilterGaussianState* gaussian, Zel8u* buffer) {
   if (ZelStatus s = checkImages({image(src, srcStep, kChannels), image(dst, dstStep, kChannels)}, roi,
-                                {spec, buffer, borderValue}))
+                                {gaussian, buffer, borderValue}))
     return s;
   if (ZelStatus s = filters::checkBorder(border)) return s;
-  const auto* state = reinterpret_cast<const GaussianState*>(alignUp(const_cast<ZeliFilterGaussianSpec*>(spec), 16));
+  const auto* state = reinterpret_cast<const GaussianState*>(alignUp(const_cast<ZeliFilterGaussianState*>(gaussian), 16));
   if (state->id != kGaussianId) return zelStatusBadContext;
   if (state->dataType != TypeCode<T>::value) return zelStatusBadDataType;
   if (state->channels != kChannels) return zelStatusBadChannels;
@@ -356,7 +356,7 @@ ZELCV_ENTRY(zeliFilterGaussianGetBufferSize)(ZeliSize roiSize, int kernelSize, Z
 }
 
 ZELCV_ENTRY(zeliFilterGaussianInit)(ZeliSize roiSize, Zel32f sigma, int kernelSize, ZelDataType dataType,
-                                    int channels, ZeliFilterGaussianSpec* state) {
+                                    int channels, ZeliFilterGaussianState* state) {
   if (!state) return zelStatusNullPointer;
   if (ZelStatus s = checkGaussianArgs(roiSize, kernelSize, dataType, channels)) return s;
   if (!std::isfinite(sigma)) return zelStatusBadArgument;
@@ -369,7 +369,7 @@ ZELCV_ENTRY(zeliFilterGaussianInit)(ZeliSize roiSize, Zel32f sigma, int kernelSi
 #define ZELCV_GAUSSIAN(suffix, T, channels, Value, valueArg)                                                   \
   ZELCV_ENTRY(zeliFilterGaussianBorder_##suffix)(const T* src, int srcStep, T* dst, int dstStep,              \
                                                  ZeliSize roiSize, ZeliBorderType borderType, Value borderValue, \
-                                                 const ZeliFilterGaussianSpec* state, Zel8u* buffer) {         \
+                                                 const ZeliFilterGaussianState* state, Zel8u* buffer) {         \
     return gaussian<T, channels>(src, srcStep, dst, dstStep, roiSize, borderType, valueArg, state, buffer);   \
   }
 ZELCV_GAUSSIAN(8u_C1R, Zel8u, 1, Zel8u, &borderValue)

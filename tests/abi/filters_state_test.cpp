@@ -50,7 +50,7 @@ template <> constexpr int typeCode<Zel32f>() { return zel32f; }
 
 template <typename T>
 ZelStatus callGaussian(int ch, const T* src, int srcStep, T* dst, int dstStep, ZeliSize roi, int border,
-                       const T* value, const ZeliFilterGaussianSpec* state, Zel8u* buffer) {
+                       const T* value, const ZeliFilterGaussianState* state, Zel8u* buffer) {
   if constexpr (std::is_same<T, Zel8u>::value)
     return ch == 1 ? zeliFilterGaussianBorder_8u_C1R(src, srcStep, dst, dstStep, roi, border, *value, state, buffer)
                    : zeliFilterGaussianBorder_8u_C3R(src, srcStep, dst, dstStep, roi, border, value, state, buffer);
@@ -82,11 +82,11 @@ void checkGaussian(std::mt19937& rng, int ch, int k, float sigma, int border) {
   ASSERT_EQ(zeliFilterGaussianGetBufferSize({w + int(rng() % 5), h}, k, typeCode<T>(), ch, &stateBytes, &bufferBytes),
             zelStatusOk);
   std::vector<Zel8u> state(size_t(stateBytes) + 1), buffer(size_t(bufferBytes) + 1);
-  auto* spec = reinterpret_cast<ZeliFilterGaussianSpec*>(state.data() + 1);  // an odd address
-  ASSERT_EQ(zeliFilterGaussianInit({w, h}, sigma, k, typeCode<T>(), ch, spec), zelStatusOk);
+  auto* gaussian = reinterpret_cast<ZeliFilterGaussianState*>(state.data() + 1);  // an odd address
+  ASSERT_EQ(zeliFilterGaussianInit({w, h}, sigma, k, typeCode<T>(), ch, gaussian), zelStatusOk);
   const T value[3] = {T(17), T(200), T(3)};
   const T* roi = &src.at(margin, margin);
-  ASSERT_EQ(callGaussian<T>(ch, roi, src.step(), dst.data(), dst.step(), {w, h}, border, value, spec,
+  ASSERT_EQ(callGaussian<T>(ch, roi, src.step(), dst.data(), dst.step(), {w, h}, border, value, gaussian,
                             buffer.data() + 1),
             zelStatusOk);
   ASSERT_TRUE(dst.sentinelIntact());
@@ -140,50 +140,50 @@ TEST(FiltersGaussian, QueryInitAndFilterChecks) {
   EXPECT_EQ(bu, 3 * (4 * 5 + 8) * 64 + 8 * 3 * 4 + 24 * 5 + 128);
 
   std::vector<Zel8u> state(static_cast<size_t>(st)), buffer(static_cast<size_t>(bu));
-  auto* spec = reinterpret_cast<ZeliFilterGaussianSpec*>(state.data());
+  auto* gaussian = reinterpret_cast<ZeliFilterGaussianState*>(state.data());
   EXPECT_EQ(zeliFilterGaussianInit(roi, 1.0f, 5, zel32f, 3, nullptr), zelStatusNullPointer);
-  EXPECT_EQ(zeliFilterGaussianInit(roi, std::numeric_limits<float>::quiet_NaN(), 5, zel32f, 3, spec),
+  EXPECT_EQ(zeliFilterGaussianInit(roi, std::numeric_limits<float>::quiet_NaN(), 5, zel32f, 3, gaussian),
             zelStatusBadArgument);
-  EXPECT_EQ(zeliFilterGaussianInit(roi, 1.0f, 5, zel64f, 3, spec), zelStatusBadDataType);
+  EXPECT_EQ(zeliFilterGaussianInit(roi, 1.0f, 5, zel64f, 3, gaussian), zelStatusBadDataType);
 
   std::vector<Zel32f> src(65 * 3 * 8, 1.0f), dst(65 * 3 * 8);
   const Zel32f value[3] = {0, 0, 0};
   const int step = 64 * 3 * 4;
   // Not initialised yet: the identifier is missing.
   std::fill(state.begin(), state.end(), Zel8u(0));
-  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, roi, zelBorderReplicate, value, spec,
+  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, roi, zelBorderReplicate, value, gaussian,
                                              buffer.data()),
             zelStatusBadContext);
-  ASSERT_EQ(zeliFilterGaussianInit(roi, 1.0f, 5, zel32f, 3, spec), zelStatusOk);
+  ASSERT_EQ(zeliFilterGaussianInit(roi, 1.0f, 5, zel32f, 3, gaussian), zelStatusOk);
   EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, roi, zelBorderReplicate, nullptr,
-                                             spec, buffer.data()),
+                                             gaussian, buffer.data()),
             zelStatusNullPointer);
   EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, {0, 8}, 5, value, nullptr,
                                              buffer.data()),
             zelStatusNullPointer);
-  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, {0, 8}, 5, value, spec,
+  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, {0, 8}, 5, value, gaussian,
                                              buffer.data()),
             zelStatusBadSize);
-  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step - 4, dst.data(), step, roi, 5, value, spec,
+  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step - 4, dst.data(), step, roi, 5, value, gaussian,
                                              buffer.data()),
             zelStatusBadStep);
-  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step + 2, dst.data(), step, roi, 5, value, spec,
+  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step + 2, dst.data(), step, roi, 5, value, gaussian,
                                              buffer.data()),
             zelStatusMisalignedStep);
-  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, roi, 5, value, spec, buffer.data()),
+  EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, roi, 5, value, gaussian, buffer.data()),
             zelStatusBadBorder);
-  EXPECT_EQ(zeliFilterGaussianBorder_32f_C1R(src.data(), step, dst.data(), step, roi, zelBorderReplicate, 0.0f, spec,
+  EXPECT_EQ(zeliFilterGaussianBorder_32f_C1R(src.data(), step, dst.data(), step, roi, zelBorderReplicate, 0.0f, gaussian,
                                              buffer.data()),
             zelStatusBadChannels);
   EXPECT_EQ(zeliFilterGaussianBorder_16u_C3R(reinterpret_cast<Zel16u*>(src.data()), step, reinterpret_cast<Zel16u*>(dst.data()), step, roi,
-                                             zelBorderReplicate, reinterpret_cast<const Zel16u*>(value), spec, buffer.data()),
+                                             zelBorderReplicate, reinterpret_cast<const Zel16u*>(value), gaussian, buffer.data()),
             zelStatusBadDataType);
   EXPECT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), 65 * 12, dst.data(), 65 * 12, {65, 8}, zelBorderReplicate,
-                                             value, spec, buffer.data()),
+                                             value, gaussian, buffer.data()),
             zelStatusBadSize);
   EXPECT_TRUE(std::all_of(dst.begin(), dst.end(), [](float v) { return v == 0.0f; }));
   // A constant image stays constant: the taps sum to one within rounding.
-  ASSERT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, roi, zelBorderReplicate, value, spec,
+  ASSERT_EQ(zeliFilterGaussianBorder_32f_C3R(src.data(), step, dst.data(), step, roi, zelBorderReplicate, value, gaussian,
                                              buffer.data()),
             zelStatusOk);
   for (size_t i = 0; i < 64 * 3 * 8; ++i) EXPECT_NEAR(dst[i], 1.0f, 1e-6f);

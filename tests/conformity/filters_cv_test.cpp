@@ -208,14 +208,14 @@ TEST(FiltersConformity, GaussianMatchesGetGaussianKernelAndGaussianBlur) {
       int st = 0, bu = 0;
       ASSERT_EQ(zeliFilterGaussianGetBufferSize(roi, k, zel32f, 1, &st, &bu), zelStatusOk);
       std::vector<Zel8u> state(static_cast<size_t>(st)), buffer(static_cast<size_t>(bu));
-      auto* spec = reinterpret_cast<ZeliFilterGaussianSpec*>(state.data());
-      ASSERT_EQ(zeliFilterGaussianInit(roi, sigma, k, zel32f, 1, spec), zelStatusOk);
+      auto* gaussian = reinterpret_cast<ZeliFilterGaussianState*>(state.data());
+      ASSERT_EQ(zeliFilterGaussianInit(roi, sigma, k, zel32f, 1, gaussian), zelStatusOk);
       std::vector<Zel32f> impulse(size_t(roi.width), 0.0f), out(static_cast<size_t>(roi.width));
       impulse[size_t(k)] = 1.0f;
       // One row with the constant border: the column pass sees the centre tap
       // times the row response, so divide it out.
       ASSERT_EQ(zeliFilterGaussianBorder_32f_C1R(impulse.data(), roi.width * 4, out.data(), roi.width * 4, roi,
-                                                 zelBorderConstant, 0.0f, spec, buffer.data()),
+                                                 zelBorderConstant, 0.0f, gaussian, buffer.data()),
                 zelStatusOk);
       const cv::Mat cvTaps = cv::getGaussianKernel(k, sigma, CV_32F);
       const float centre = cvTaps.at<float>(k / 2);
@@ -230,13 +230,13 @@ TEST(FiltersConformity, GaussianMatchesGetGaussianKernelAndGaussianBlur) {
       ASSERT_EQ(zeliFilterGaussianGetBufferSize(img, k, zel8u, 3, &st, &bu), zelStatusOk);
       state.assign(size_t(st), 0);
       buffer.assign(size_t(bu), 0);
-      ASSERT_EQ(zeliFilterGaussianInit(img, sigma, k, zel8u, 3, spec), zelStatusOk);
+      ASSERT_EQ(zeliFilterGaussianInit(img, sigma, k, zel8u, 3, gaussian), zelStatusOk);
       const cv::Mat src = randomImage(rng, img.width, img.height, CV_8UC3);
       cv::Mat ref, dst(img.height, img.width, CV_8UC3);
       cv::GaussianBlur(src, ref, cv::Size(k, k), sigma, sigma, cv::BORDER_REFLECT_101);
       const Zel8u zero[3] = {0, 0, 0};
       ASSERT_EQ(zeliFilterGaussianBorder_8u_C3R(src.ptr<Zel8u>(), int(src.step), dst.ptr<Zel8u>(), int(dst.step), img,
-                                                zelBorderMirror, zero, spec, buffer.data()),
+                                                zelBorderMirror, zero, gaussian, buffer.data()),
                 zelStatusOk);
       EXPECT_LE(cv::norm(dst, ref, cv::NORM_INF), 2.0);
     }

@@ -9,7 +9,7 @@ zeltorture::Maker gaussian(int dataType, int channels) {
   return {[=](zeltorture::Arena& a, ZeliSize roi) -> void* {
             int stateSize = 0, bufferSize = 0;
             if (zeliFilterGaussianGetBufferSize(roi, 5, dataType, channels, &stateSize, &bufferSize)) return nullptr;
-            auto* state = static_cast<ZeliFilterGaussianSpec*>(a.block(size_t(stateSize)));
+            auto* state = static_cast<ZeliFilterGaussianState*>(a.block(size_t(stateSize)));
             return zeliFilterGaussianInit(roi, 1.2f, 5, dataType, channels, state) ? nullptr : state;
           },
           nullptr};
