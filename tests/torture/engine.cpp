@@ -168,7 +168,7 @@ int widthOfParams(Role r) {
 
 // Pixel fill that every operation takes without a special case: small
 // integers, also in floating images (no NaN, no overflowing sums).
-void fillPixels(uint8_t* p, std::size_t bytes, const Spec& s, std::mt19937& rng) {
+void fillPixels(uint8_t* p, std::size_t bytes, const Arg& s, std::mt19937& rng) {
   if (s.floating && s.elemSize == 4) {
     for (std::size_t i = 0; i + 4 <= bytes; i += 4) {
       float f = float(rng() % 256);
@@ -240,7 +240,7 @@ bool callCatching(const Entry& e, const Frame& frame, bool, ZelStatus& status) {
 
 }  // namespace
 
-bool Spec::pointer() const {
+bool Arg::pointer() const {
   switch (role) {
     case Role::Image: case Role::BitImage: case Role::Rows: case Role::Array: case Role::Result:
     case Role::Buffer: case Role::Block: case Role::State: case Role::New: case Role::Object:
@@ -250,19 +250,19 @@ bool Spec::pointer() const {
   }
 }
 
-int64_t Spec::checkedRowBytes(int64_t width) const {
+int64_t Arg::checkedRowBytes(int64_t width) const {
   if (role == Role::BitImage) return (width + extraCols + 7) / 8;
   return (scaled(width) + extraCols) * channels * elemSize;
 }
 
-std::string parseRoles(const Entry& e, std::vector<Spec>& specs) {
-  specs.clear();
+std::string parseRoles(const Entry& e, std::vector<Arg>& args) {
+  args.clear();
   std::stringstream ss(e.roles);
   std::string token;
   int param = 0;
   auto fail = [&](const std::string& why) { return "'" + token + "': " + why; };
   while (ss >> token) {
-    Spec s;
+    Arg s;
     s.param = param;
     std::string head = token, mods;
     std::size_t colon = token.find(':');
@@ -394,7 +394,7 @@ std::string parseRoles(const Entry& e, std::vector<Spec>& specs) {
     for (int k = 1; k < n; ++k)
       if (e.params[size_t(param + k)].kind != 'i') return fail("step and bit offset must be integers");
     param += n;
-    specs.push_back(s);
+    args.push_back(s);
   }
   if (param != int(e.params.size()))
     return "roles cover " + std::to_string(param) + " of " + std::to_string(e.params.size()) + " parameters";
@@ -406,7 +406,7 @@ const std::vector<Described>& described() {
     std::vector<Described> out;
     for (const Entry& e : registry().entries) {
       Described d{&e, {}};
-      std::string error = parseRoles(e, d.specs);
+      std::string error = parseRoles(e, d.args);
       if (!error.empty()) {
         std::fprintf(stderr, "torture table: %s: %s\n", e.name.c_str(), error.c_str());
         std::abort();
@@ -431,7 +431,7 @@ struct ImageMemory {
 
 }  // namespace
 
-Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, int failAllocationsFrom) {
+Outcome run(const Entry& e, const std::vector<Arg>& args, const Variant& v, int failAllocationsFrom) {
   Outcome out;
   std::unique_ptr<zeltest::FaultInjection> injection;
   if (v.countAllocations) injection = std::make_unique<zeltest::FaultInjection>();
@@ -439,18 +439,18 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
   std::mt19937 rng(12345);
   const int w = v.roi.width, h = v.roi.height;
   Frame frame(e.params.size());
-  std::vector<ImageMemory> images(specs.size());
-  std::vector<std::unique_ptr<Memory>> blocks(specs.size());
-  std::vector<int> results(specs.size(), kResultSentinel);
-  std::vector<void*> newSlots(specs.size(), nullptr);
+  std::vector<ImageMemory> images(args.size());
+  std::vector<std::unique_ptr<Memory>> blocks(args.size());
+  std::vector<int> results(args.size(), kResultSentinel);
+  std::vector<void*> newSlots(args.size(), nullptr);
   static int newSentinel;
-  std::vector<void*> objects(specs.size(), nullptr);
-  std::vector<void*> states(specs.size(), nullptr);  // states the library allocated
+  std::vector<void*> objects(args.size(), nullptr);
+  std::vector<void*> states(args.size(), nullptr);  // states the library allocated
 
-  for (std::size_t i = 0; i < specs.size(); ++i) {
-    const Spec& s = specs[i];
+  for (std::size_t i = 0; i < args.size(); ++i) {
+    const Arg& s = args[i];
     Value& val = frame[size_t(s.param)];
-    Placement placement = int(i) == v.pageSpec ? (v.pageBegin ? Placement::PageBegin : Placement::PageEnd)
+    Placement placement = int(i) == v.pageArg ? (v.pageBegin ? Placement::PageBegin : Placement::PageEnd)
                                                : Placement::Guarded;
     switch (s.role) {
       case Role::Image:
@@ -529,34 +529,34 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
     }
   }
   if (!out.setupError.empty()) {
-    for (std::size_t i = 0; i < specs.size(); ++i) {
-      if (objects[i]) findMaker(specs[i].maker)->release(objects[i]);
-      if (states[i]) findMaker(specs[i].maker)->release(states[i]);
+    for (std::size_t i = 0; i < args.size(); ++i) {
+      if (objects[i]) findMaker(args[i].maker)->release(objects[i]);
+      if (states[i]) findMaker(args[i].maker)->release(states[i]);
     }
     return out;
   }
 
   std::vector<std::vector<void*>> rowCopies;
   for (const Mutation& m : v.mutations) {
-    const Spec* s = m.spec >= 0 ? &specs[size_t(m.spec)] : nullptr;
+    const Arg* s = m.arg >= 0 ? &args[size_t(m.arg)] : nullptr;
     switch (m.kind) {
       case Mutation::Null: frame[size_t(s->param)].p = nullptr; break;
       case Mutation::RowEntryNull: {
-        rowCopies.push_back(images[size_t(m.spec)].rowPointers);
+        rowCopies.push_back(images[size_t(m.arg)].rowPointers);
         rowCopies.back().back() = nullptr;
         frame[size_t(s->param)].p = rowCopies.back().data();
         break;
       }
       case Mutation::Width:
       case Mutation::Height:
-        for (const Spec& r : specs)
+        for (const Arg& r : args)
           if (r.role == Role::Roi) {
             if (m.kind == Mutation::Width) frame[size_t(r.param)].size.width = int(m.value);
             else frame[size_t(r.param)].size.height = int(m.value);
           }
         break;
       case Mutation::RoiWidth:
-        for (const Spec& r : specs)
+        for (const Arg& r : args)
           if (r.role == Role::RoiWidth) frame[size_t(r.param)].i = m.value;
         break;
       case Mutation::Step: frame[size_t(s->param + 1)].i = m.value; break;
@@ -567,15 +567,15 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
   // What the call may not change when it fails.
   auto snapshot = [&](bool withBlocks) {
     std::vector<std::vector<uint8_t>> snap;
-    for (std::size_t i = 0; i < specs.size(); ++i) {
+    for (std::size_t i = 0; i < args.size(); ++i) {
       if (images[i].memory) {
         const ImageMemory& im = images[i];
-        std::size_t bytes = specs[i].role == Role::Rows ? im.extent * size_t(im.rows)
+        std::size_t bytes = args[i].role == Role::Rows ? im.extent * size_t(im.rows)
                                                         : size_t(im.step) * size_t(im.rows - 1) + im.extent;
         snap.emplace_back(im.memory->data(), im.memory->data() + bytes);
       }
-      if (specs[i].role == Role::Block && withBlocks)
-        snap.emplace_back(blocks[i]->data(), blocks[i]->data() + specs[i].bytes);
+      if (args[i].role == Role::Block && withBlocks)
+        snap.emplace_back(blocks[i]->data(), blocks[i]->data() + args[i].bytes);
     }
     snap.emplace_back(reinterpret_cast<uint8_t*>(results.data()),
                       reinterpret_cast<uint8_t*>(results.data() + results.size()));
@@ -597,8 +597,8 @@ Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, in
   out.untouched = snapshot(true) == before;
   out.imagesUntouched = snapshot(false) == beforeImages;
 
-  for (std::size_t i = 0; i < specs.size(); ++i) {
-    const Spec& s = specs[i];
+  for (std::size_t i = 0; i < args.size(); ++i) {
+    const Arg& s = args[i];
     if (s.role == Role::New) {
       if (newSlots[i] != &newSentinel) {
         if (out.status == zelStatusOk && newSlots[i]) findMaker(s.maker)->release(newSlots[i]);

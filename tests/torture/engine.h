@@ -33,7 +33,7 @@ enum class Role {
   Null       // always null
 };
 
-struct Spec {
+struct Arg {
   Role role = Role::Scalar;
   int param = 0;        // index of the first parameter it covers
   char dir = 'i';       // images: 'i' in, 'o' out, 'b' both, 'm' mask
@@ -72,19 +72,19 @@ struct Spec {
 };
 
 // Parses an entry's roles against its parameters; an error message or "".
-std::string parseRoles(const Entry& e, std::vector<Spec>& specs);
+std::string parseRoles(const Entry& e, std::vector<Arg>& args);
 
 enum class Placement { Guarded, PageEnd, PageBegin };
 
 struct Mutation {
   enum Kind { Null, RowEntryNull, Width, Height, RoiWidth, Step, BitOffset } kind;
-  int spec = -1;          // which Spec (Null, RowEntryNull, Step, BitOffset)
+  int arg = -1;           // which argument (Null, RowEntryNull, Step, BitOffset)
   long long value = 0;
 };
 
 struct Variant {
   ZeliSize roi{13, 7};          // what the memory is made for
-  int pageSpec = -1;            // this image's rows end (or begin) at an inaccessible page
+  int pageArg = -1;             // this image's rows end (or begin) at an inaccessible page
   bool pageBegin = false;
   bool odd = false;             // odd steps where accepted, odd buffer and state addresses
   int border = 0;               // which border alternative
@@ -109,12 +109,12 @@ struct Outcome {
 };
 
 // Calls the export; failAllocationsFrom >= 0 makes that allocation fail.
-Outcome run(const Entry& e, const std::vector<Spec>& specs, const Variant& v, int failAllocationsFrom = -1);
+Outcome run(const Entry& e, const std::vector<Arg>& args, const Variant& v, int failAllocationsFrom = -1);
 
 // All entries, parsed; fails the calling test on a parse error.
 struct Described {
   const Entry* entry;
-  std::vector<Spec> specs;
+  std::vector<Arg> args;
 };
 const std::vector<Described>& described();
 

@@ -29,7 +29,7 @@ TEST(Threads, EveryExportFromSeveralThreadsAtOnce) {
         Variant v;
         v.countAllocations = false;
         v.roi = {9 + 4 * t, 5 + t};
-        Outcome o = run(*d.entry, d.specs, v);
+        Outcome o = run(*d.entry, d.args, v);
         if (!o.setupError.empty() || o.status != zelStatusOk || !o.guardsIntact) ++failures;
       }
     });

@@ -19,19 +19,19 @@ namespace {
 using Kind = Mutation::Kind;
 
 bool hasImages(const Described& d) {
-  for (const Spec& s : d.specs)
+  for (const Arg& s : d.args)
     if (s.isImage() || s.role == Role::Rows) return true;
   return false;
 }
 
 int firstStepped(const Described& d) {
-  for (std::size_t i = 0; i < d.specs.size(); ++i)
-    if (d.specs[i].stepped()) return int(i);
+  for (std::size_t i = 0; i < d.args.size(); ++i)
+    if (d.args[i].stepped()) return int(i);
   return -1;
 }
 
 bool has(const Described& d, Role r) {
-  for (const Spec& s : d.specs)
+  for (const Arg& s : d.args)
     if (s.role == r) return true;
   return false;
 }
@@ -47,14 +47,14 @@ std::string describeMutations(const Variant& v) {
   static const char* names[] = {"null", "row entry null", "width", "height", "roi width", "step", "bit offset"};
   std::string out = "roi " + std::to_string(v.roi.width) + "x" + std::to_string(v.roi.height);
   for (const Mutation& m : v.mutations)
-    out += std::string(", ") + names[m.kind] + (m.spec >= 0 ? " of argument " + std::to_string(m.spec) : "") + " = " +
+    out += std::string(", ") + names[m.kind] + (m.arg >= 0 ? " of argument " + std::to_string(m.arg) : "") + " = " +
            std::to_string(m.value);
   return out;
 }
 
 // The call fails with `code`, writes nothing and keeps nothing.
 void expectRefused(const Described& d, const Variant& v, ZelStatus code) {
-  Outcome o = run(*d.entry, d.specs, v);
+  Outcome o = run(*d.entry, d.args, v);
   ASSERT_EQ(o.setupError, "") << d.entry->name;
   EXPECT_FALSE(o.faulted) << d.entry->name << " faulted: " << describeMutations(v);
   if (o.faulted) return;
@@ -73,7 +73,7 @@ TEST(Torture, EveryExportIsDescribed) {
 
 TEST(Torture, DescribedCallsSucceed) {
   for (const Described& d : described()) {
-    Outcome o = run(*d.entry, d.specs, Variant{});
+    Outcome o = run(*d.entry, d.args, Variant{});
     ASSERT_EQ(o.setupError, "") << d.entry->name;
     EXPECT_EQ(o.status, zelStatusOk) << d.entry->name << " refuses the described call";
     EXPECT_TRUE(o.guardsIntact) << d.entry->name;
@@ -84,8 +84,8 @@ TEST(Torture, DescribedCallsSucceed) {
 TEST(Torture, NullPointers) {
   for (const Described& d : described()) {
     const int stepped = firstStepped(d);
-    for (std::size_t i = 0; i < d.specs.size(); ++i) {
-      const Spec& s = d.specs[i];
+    for (std::size_t i = 0; i < d.args.size(); ++i) {
+      const Arg& s = d.args[i];
       if (!s.pointer() || !s.nullable) continue;
       std::vector<Mutation> kinds = {{Kind::Null, int(i), 0}};
       if (s.role == Role::Rows) kinds.push_back({Kind::RowEntryNull, int(i), 0});
@@ -125,8 +125,8 @@ TEST(Torture, SizesZeroAndNegative) {
         }
       }
     }
-    for (std::size_t i = 0; i < d.specs.size(); ++i)
-      if (d.specs[i].role == Role::BitImage) {
+    for (std::size_t i = 0; i < d.args.size(); ++i)
+      if (d.args[i].role == Role::BitImage) {
         Variant v;
         v.mutations = {{Kind::BitOffset, int(i), -1}};
         expectRefused(d, v, zelStatusBadSize);
@@ -137,8 +137,8 @@ TEST(Torture, SizesZeroAndNegative) {
 TEST(Torture, StepsBelowTheRowAndMisaligned) {
   for (const Described& d : described()) {
     Variant base;
-    for (std::size_t i = 0; i < d.specs.size(); ++i) {
-      const Spec& s = d.specs[i];
+    for (std::size_t i = 0; i < d.args.size(); ++i) {
+      const Arg& s = d.args[i];
       if (!s.stepped()) continue;
       const long long rowBytes = s.checkedRowBytes(base.roi.width);
       for (long long step : {0LL, -rowBytes, (long long)INT_MIN, rowBytes - 1}) {
@@ -170,8 +170,8 @@ TEST(Torture, SizesNearIntMax) {
         v.mutations = badSize(d, w);
         expectRefused(d, v, zelStatusBadStep);
       }
-      const Spec* roi = nullptr;
-      for (const Spec& s : d.specs)
+      const Arg* roi = nullptr;
+      for (const Arg& s : d.args)
         if (s.role == Role::Roi) roi = &s;
       if (!roi) continue;
       // A width above the state's with steps that hold it, up to INT_MAX.
@@ -182,9 +182,9 @@ TEST(Torture, SizesNearIntMax) {
           v.roi = {13, 1};
           v.mutations = badSize(d, w);
           bool fits = true;
-          for (std::size_t i = 0; i < d.specs.size(); ++i)
-            if (d.specs[i].stepped()) {
-              long long bytes = d.specs[i].checkedRowBytes(w);
+          for (std::size_t i = 0; i < d.args.size(); ++i)
+            if (d.args[i].stepped()) {
+              long long bytes = d.args[i].checkedRowBytes(w);
               if (bytes > INT_MAX) fits = false;
               v.mutations.push_back({Kind::Step, int(i), bytes});
             }
@@ -195,7 +195,7 @@ TEST(Torture, SizesNearIntMax) {
       // border the entry names.
       if (roi->boundH) {
         std::size_t borders = 1;
-        for (const Spec& s : d.specs)
+        for (const Arg& s : d.args)
           if (s.role == Role::Border) borders = s.values.size();
         for (long long hgt : {(long long)INT_MAX, (long long)INT_MAX - 1, (long long)INT_MAX / 2 + 1})
           for (std::size_t b = 0; b < borders; ++b) {
@@ -209,13 +209,13 @@ TEST(Torture, SizesNearIntMax) {
     }
     // Queries, Init and InitAlloc: refused as too big, or answered with no
     // less than for a small size (a wrapped size would be smaller).
-    Outcome small = run(*d.entry, d.specs, Variant{});
+    Outcome small = run(*d.entry, d.args, Variant{});
     for (bool height : {false, true})
       for (long long n : kHugeWidths) {
         Variant v;
         v.mutations = badSize(d, n, height);
         if (v.mutations.empty()) continue;
-        Outcome o = run(*d.entry, d.specs, v);
+        Outcome o = run(*d.entry, d.args, v);
         SCOPED_TRACE(d.entry->name + ": " + describeMutations(v));
         EXPECT_TRUE(o.status == zelStatusOk || o.status == zelStatusBadSize || o.status == zelStatusOutOfMemory)
             << o.status;
@@ -234,15 +234,15 @@ TEST(Torture, RowsAgainstAnInaccessiblePage) {
   for (const Described& d : described()) {
     if (!hasImages(d)) continue;
     for (int w = 1; w <= 70; ++w)
-      for (std::size_t i = 0; i < d.specs.size(); ++i) {
-        if (!d.specs[i].readsPixels()) continue;
+      for (std::size_t i = 0; i < d.args.size(); ++i) {
+        if (!d.args[i].readsPixels()) continue;
         for (bool begin : {false, true}) {
           Variant v;
           v.roi = {w, 1};
-          v.pageSpec = int(i);
+          v.pageArg = int(i);
           v.pageBegin = begin;
           v.catchFaults = true;
-          Outcome o = run(*d.entry, d.specs, v);
+          Outcome o = run(*d.entry, d.args, v);
           ASSERT_EQ(o.setupError, "") << d.entry->name;
           const std::string where = d.entry->name + " width " + std::to_string(w) + ", argument " +
                                     std::to_string(i) + (begin ? " beginning at" : " ending at") +
@@ -264,8 +264,8 @@ TEST(Torture, OddStepsAndBufferAddresses) {
       aligned.roi = roi;
       Variant odd = aligned;
       odd.odd = true;
-      Outcome a = run(*d.entry, d.specs, aligned);
-      Outcome b = run(*d.entry, d.specs, odd);
+      Outcome a = run(*d.entry, d.args, aligned);
+      Outcome b = run(*d.entry, d.args, odd);
       ASSERT_EQ(b.setupError, "") << d.entry->name;
       EXPECT_EQ(a.status, zelStatusOk) << d.entry->name;
       EXPECT_EQ(b.status, zelStatusOk) << d.entry->name << " refuses odd steps or buffers";
@@ -278,9 +278,9 @@ TEST(Torture, OddStepsAndBufferAddresses) {
 
 TEST(Torture, AllocationFailuresReleaseEverything) {
   for (const Described& d : described()) {
-    Outcome full = run(*d.entry, d.specs, Variant{});
+    Outcome full = run(*d.entry, d.args, Variant{});
     for (int k = 0; k < full.allocations; ++k) {
-      Outcome o = run(*d.entry, d.specs, Variant{}, k);
+      Outcome o = run(*d.entry, d.args, Variant{}, k);
       EXPECT_EQ(o.status, zelStatusOutOfMemory) << d.entry->name << " allocation " << k;
       // An Init may have built part of a state into the caller's block.
       EXPECT_TRUE(o.imagesUntouched) << d.entry->name << " allocation " << k;
