@@ -28,7 +28,7 @@ set_target_properties(zelcore_faults PROPERTIES OUTPUT_NAME zelcore PREFIX "" IM
 
 add_executable(zelcv_tests ${ZELCV_ABI_TESTS} ${ZELCV_TEST_SUPPORT})
 target_include_directories(zelcv_tests PRIVATE ${CMAKE_CURRENT_SOURCE_DIR} ${ZELCV_GENERATED})
-target_compile_options(zelcv_tests PRIVATE ${ZELCV_WARNINGS})
+zelcv_test_compile_options(zelcv_tests)
 target_link_libraries(zelcv_tests PRIVATE zelcv zelcore_faults GTest::gtest_main)
 add_dependencies(zelcv_tests zelcv_entry_table)
 set_target_properties(zelcv_tests PROPERTIES RUNTIME_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR})
