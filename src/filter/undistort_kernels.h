@@ -247,10 +247,18 @@ struct QuadKernel<uint8_t, 3> {
       const __m128i sum = _mm_add_epi32(_mm_madd_epi16(pairs(p), wtl), _mm_madd_epi16(pairs(p + s.step), wbl));
       r[k] = _mm_srli_epi32(_mm_add_epi32(sum, round), kWeightShift);
     }
+    // Pixel k sits in bytes 4k .. 4k + 2 (byte 4k + 3 is left over): close
+    // the gaps inside each 64-bit half, then between the halves, and store
+    // 12 bytes.
     const __m128i packed = _mm_packus_epi16(_mm_packs_epi32(r[0], r[1]), _mm_packs_epi32(r[2], r[3]));
-    alignas(16) uint8_t bytes[16];
-    _mm_store_si128(reinterpret_cast<__m128i*>(bytes), packed);
-    for (int k = 0; k < 4; ++k) memcpy(out + 3 * k, bytes + 4 * k, 3);
+    const __m128i even = _mm_set_epi32(0, 0x00FFFFFF, 0, 0x00FFFFFF), odd = _mm_slli_epi64(even, 32);
+    const __m128i halves =
+        _mm_or_si128(_mm_and_si128(packed, even), _mm_srli_epi64(_mm_and_si128(packed, odd), 8));
+    const __m128i lowHalf = _mm_set_epi32(0, 0, -1, -1);
+    const __m128i joined =
+        _mm_or_si128(_mm_and_si128(halves, lowHalf), _mm_srli_si128(_mm_andnot_si128(lowHalf, halves), 2));
+    _mm_storel_epi64(reinterpret_cast<__m128i*>(out), joined);
+    simd::storeOne(reinterpret_cast<int32_t*>(out + 8), _mm_cvtsi128_si32(_mm_srli_si128(joined, 8)));
   }
 };
 
@@ -271,7 +279,7 @@ struct QuadKernel<float, 3> {
                    _mm_mul_ps(_mm_loadu_ps(d), lane<k>(w10))),
         _mm_mul_ps(_mm_loadu_ps(d + 3), lane<k>(w11)));
     _mm_storel_pi(reinterpret_cast<__m64*>(out + 3 * k), r);
-    _mm_store_ss(out + 3 * k + 2, _mm_movehl_ps(r, r));
+    simd::storeOne(out + 3 * k + 2, _mm_cvtss_f32(_mm_movehl_ps(r, r)));
   }
   static void run(const Source<float>& s, const Quad& q, float* out) {
     alignas(16) int32_t ix[4], iy[4];
