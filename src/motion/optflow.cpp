@@ -10,6 +10,7 @@
 #include <cmath>
 
 #include "core/alloc.h"
+#include "core/load.h"
 #include "core/status.h"
 #include "filter/derivative.h"
 #include "motion/optflow_state.h"
@@ -144,6 +145,7 @@ inline bool sameRect(ZeliRect a, ZeliRect b) {
 struct Params {
   int winSize, maxIter;
   double threshold2;
+  bool wide;  // the AVX2 sums
 };
 
 // One point at one level. Returns false when the point is lost; `next`
@@ -201,10 +203,10 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
       return false;
     }
     if (!sameRect(r, gRect)) {
-      gs = gradientSums(set, r);
+      gs = prm.wide ? avx2::optflowGradientSums(set, r) : gradientSums(set, r);
       gRect = r;
     }
-    ms = mismatchSums(set, r);
+    ms = prm.wide ? avx2::optflowMismatchSums(set, r) : mismatchSums(set, r);
     last = r;
     const double det = gs.xx * gs.yy - gs.xy * gs.xy;
     if (!(det >= DBL_EPSILON)) return false;
@@ -263,7 +265,7 @@ ZelStatus track(const ZeliPyramid* pyramid1, const ZeliPyramid* pyramid2, const 
 
   const WorkLayout w(state->work, state->roiSize, winSize);
   memset(w.i, 0, w.windowBytes);
-  const Params prm{winSize, maxIter, double(threshold) * double(threshold)};
+  const Params prm{winSize, maxIter, double(threshold) * double(threshold), useAvx2Kernels()};
   for (int i = 0; i < numFeat; ++i) status[i] = Zel8s(maxLev + 1);
   for (int l = maxLev; l >= 0; --l) {
     const Zel8s active = Zel8s(l + 1);

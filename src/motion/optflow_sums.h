@@ -113,6 +113,12 @@ inline MismatchSums mismatchSums(const WindowSet& w, ZeliRect r) {
 }
 
 }  // namespace optflow
+
+// The same sums with AVX2, the same bits. Defined in optflow_sums_avx2.cpp.
+namespace avx2 {
+optflow::GradientSums optflowGradientSums(const optflow::WindowSet& w, ZeliRect r);
+optflow::MismatchSums optflowMismatchSums(const optflow::WindowSet& w, ZeliRect r);
+}  // namespace avx2
 }  // namespace zelcv
 
 #endif  // ZELCV_MOTION_OPTFLOW_SUMS_H
