@@ -35,5 +35,6 @@ int demoDistance(const DemoImage* image, const char* outDir);
 int demoFilters(const DemoImage* image, const char* outDir);
 int demoStatistics(const DemoImage* image, const char* outDir);
 int demoUndistort(const DemoImage* image, const char* outDir);
+int demoOptFlow(const DemoImage* image, const char* outDir);
 
 #endif

@@ -39,6 +39,7 @@ int main(int argc, char** argv) {
   failures |= demoFilters(&image, outDir);
   failures |= demoStatistics(&image, outDir);
   failures |= demoUndistort(&image, outDir);
+  failures |= demoOptFlow(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

@@ -23,5 +23,6 @@
 #include "zelcv/filters.h"
 #include "zelcv/statistics.h"
 #include "zelcv/undistort.h"
+#include "zelcv/optflow.h"
 
 #endif /* ZELCV_H */

@@ -56,6 +56,15 @@ class DerivativeRows {
   Zel8u* constantRow_;  // width pixels of borderValue (constant kind only)
 };
 
+// Both 3x3 Scharr derivatives of a 32f image, by the engine of the exported
+// 32f members (dx as ScharrVert, dy as ScharrHoriz, the same bits), for
+// callers that need whole derivative images. `buffer` holds
+// scharr32fBufferBytes(width) bytes at any address; the border value of the
+// constant kind is 0.
+int64_t scharr32fBufferBytes(int width);
+void scharr32f(const Zel32f* src, int srcStep, ZeliSize roi, ZeliBorderType border, Zel32f* dx, int dxStep,
+               Zel32f* dy, int dyStep, Zel8u* buffer);
+
 }  // namespace zelcv
 
 #endif  // ZELCV_FILTER_DERIVATIVE_H

@@ -20,6 +20,7 @@
 #include "core/alloc.h"
 #include "core/status.h"
 #include "filter/border.h"
+#include "filter/derivative.h"
 #include "filter/filters_common.h"
 #include "filter/sepfilter_kernels.h"
 #include "zelcv/filters.h"
@@ -224,6 +225,17 @@ ZelStatus floatQuery(ZeliSize roi, int mask, bool has5x5, int* bufferSize) {
 }
 
 }  // namespace
+
+int64_t scharr32fBufferBytes(int width) { return filters::floatBufferBytes(width, 3, 1, kMaxTerms); }
+
+void scharr32f(const Zel32f* src, int srcStep, ZeliSize roi, ZeliBorderType border, Zel32f* dx, int dxStep,
+               Zel32f* dy, int dyStep, Zel8u* buffer) {
+  const Zel32f zero = 0.0f;
+  const FloatSource<Zel32f> source{src, srcStep, roi, 1, border, &zero};
+  runFloat(source, dx, dxStep, kScharrVert.t3, kScharrVert.n3, 3, buffer);
+  runFloat(source, dy, dyStep, kScharrHoriz.t3, kScharrHoriz.n3, 3, buffer);
+}
+
 }  // namespace zelcv
 
 using namespace zelcv;

@@ -140,6 +140,31 @@ TEST(Threads, SharedSourcesAndStates) {
     out.insert(out.end(), reinterpret_cast<uint8_t*>(closed.data()), reinterpret_cast<uint8_t*>(closed.data() + closed.size()));
     return out;
   });
+
+  // Optical flow: two shared pyramids (the source and its copy moved by a
+  // row), each thread with its own tracking state, which the call writes.
+  Zel8u* first[1] = {const_cast<Zel8u*>(s.src8.data())};
+  Zel8u* second[1] = {const_cast<Zel8u*>(s.src8.data()) + W};
+  ZeliSize levelSize[1] = {{W, H - 1}};
+  Zel64f scale[1] = {1.0};
+  int levelStep[1] = {W};
+  const ZeliPyramid pyr1 = {first, levelSize, scale, levelStep, nullptr, 0};
+  const ZeliPyramid pyr2 = {second, levelSize, scale, levelStep, nullptr, 0};
+  expectSameFromEveryThread([&](int) {
+    ZeliOptFlowPyrLKState* lk = nullptr;
+    EXPECT_EQ(zeliOpticalFlowPyrLKInitAlloc_8u_C1R(&lk, {W, H}, 7, 0), zelStatusOk);
+    const ZeliPoint_32f prev[3] = {{20.0f, 10.0f}, {40.5f, 12.0f}, {60.0f, 5.0f}};
+    ZeliPoint_32f next[3] = {prev[0], prev[1], prev[2]};
+    Zel8s status[3];
+    Zel32f error[3];
+    EXPECT_EQ(zeliOpticalFlowPyrLK_8u_C1R(&pyr1, &pyr2, prev, next, status, error, 3, 7, 0, 10, 0.01f, lk),
+              zelStatusOk);
+    zeliOpticalFlowPyrLKFree_8u_C1R(lk);
+    std::vector<uint8_t> out(reinterpret_cast<uint8_t*>(next), reinterpret_cast<uint8_t*>(next + 3));
+    out.insert(out.end(), reinterpret_cast<uint8_t*>(status), reinterpret_cast<uint8_t*>(status + 3));
+    out.insert(out.end(), reinterpret_cast<uint8_t*>(error), reinterpret_cast<uint8_t*>(error + 3));
+    return out;
+  });
 }
 
 }  // namespace
