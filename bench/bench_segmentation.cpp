@@ -32,7 +32,7 @@ void registerLabels(const Size& s, bool conn8) {
         cv::Mat labels(src->rows, src->cols, CV_32SC1);
         int bytes = 0, num = 0;
         zeliLabelMarkersGetBufferSize_8u32s_C1R(zelbench::roiOf(*src), &bytes);
-        std::vector<Zel8u> buffer(size_t(bytes));
+        std::vector<Zel8u> buffer(static_cast<size_t>(bytes));
         for (auto _ : state) {
           zeliLabelMarkers_8u32s_C1R(src->data, zelbench::stepOf(*src), labels.ptr<Zel32s>(),
                                      zelbench::stepOf(labels), zelbench::roiOf(*src), 1, 1 << 30,
@@ -63,7 +63,7 @@ void registerSpeckles(const Size& s) {
         cv::Mat img = pristine->clone();
         int bytes = 0;
         zeliMarkSpecklesGetBufferSize(zelbench::roiOf(img), zel16s, &bytes);
-        std::vector<Zel8u> buffer(size_t(bytes));
+        std::vector<Zel8u> buffer(static_cast<size_t>(bytes));
         for (auto _ : state) {
           state.PauseTiming();
           pristine->copyTo(img);
@@ -106,7 +106,7 @@ void registerWatershed(const Size& s) {
         cv::Mat markers = seeds8->clone();
         int bytes = 0;
         zeliSegmentWatershedGetBufferSize_8u_C1R(zelbench::roiOf(markers), &bytes);
-        std::vector<Zel8u> buffer(size_t(bytes));
+        std::vector<Zel8u> buffer(static_cast<size_t>(bytes));
         for (auto _ : state) {
           state.PauseTiming();
           seeds8->copyTo(markers);

@@ -1,5 +1,5 @@
-/* Segmentation: the picture's bright regions (above 128) are labelled,
- * 8-connected, and written in colour, one colour per label, with the lines
+/* Segmentation: the picture is cut into four grey bands, its regions of
+ * equal band are labelled, 8-connected, and written in colour, one colour per label, with the lines
  * where labels change in black; then a scratch drawn across the picture is
  * inpainted by fast marching, and the scratched and repaired pictures are
  * written. */
@@ -43,7 +43,7 @@ int demoSegmentation(const DemoImage* image, const char* outDir) {
     goto done;
   }
   for (int y = 0; y < h; ++y)
-    for (int x = 0; x < w; ++x) binary[y * w + x] = image->pixels[y * image->step + x] > 128;
+    for (int x = 0; x < w; ++x) binary[y * w + x] = (Zel8u)(1 + image->pixels[y * image->step + x] / 64);
   failures = demoCheck("zeliLabelMarkers_8u32s_C1R",
                        zeliLabelMarkers_8u32s_C1R(binary, w, labels, w * (int)sizeof(Zel32s), roi, 1, 1 << 30,
                                                   zelNormInf, &regions, buffer));
@@ -53,12 +53,12 @@ int demoSegmentation(const DemoImage* image, const char* outDir) {
   for (int i = 0; i < w * h; ++i) {
     const unsigned l = (unsigned)labels[i];
     const unsigned hash = l * 2654435761u;
-    const int line = labels[i] == -1, background = labels[i] == 0;
-    rgb[3 * i + 0] = (Zel8u)(line ? 0 : background ? 40 : 64 + (hash >> 24) % 192);
-    rgb[3 * i + 1] = (Zel8u)(line ? 0 : background ? 40 : 64 + (hash >> 16) % 192);
-    rgb[3 * i + 2] = (Zel8u)(line ? 0 : background ? 40 : 64 + (hash >> 8) % 192);
+    const int line = labels[i] == -1;
+    rgb[3 * i + 0] = (Zel8u)(line ? 0 : 64 + (hash >> 24) % 192);
+    rgb[3 * i + 1] = (Zel8u)(line ? 0 : 64 + (hash >> 16) % 192);
+    rgb[3 * i + 2] = (Zel8u)(line ? 0 : 64 + (hash >> 8) % 192);
   }
-  printf("  segmentation: %d bright regions\n", regions);
+  printf("  segmentation: %d regions of four grey bands\n", regions);
   failures = writePpm(outDir, "segmentation_labels.ppm", rgb, w, h);
 
   /* A scratch three pixels wide along a diagonal and a bar across. */

@@ -34,7 +34,7 @@ TEST(Segmentation, LabelsGiveTheSamePartitionAsConnectedComponents) {
     cv::Mat ours(h, w, CV_32SC1);
     int bytes = 0, num = 0;
     ASSERT_EQ(zeliLabelMarkersGetBufferSize_8u32s_C1R({w, h}, &bytes), 0);
-    std::vector<Zel8u> buf(size_t(bytes));
+    std::vector<Zel8u> buf(static_cast<size_t>(bytes));
     ASSERT_EQ(zeliLabelMarkers_8u32s_C1R(src.data, int(src.step), ours.ptr<Zel32s>(), int(ours.step), {w, h}, 1,
                                          1 << 30, conn == 8 ? zelNormInf : zelNormL1, &num, buf.data()),
               0);
@@ -66,7 +66,7 @@ void speckles(int cvType, ZelStatus (*fn)(T*, int, ZeliSize, T, int, T, int, Zel
     cv::filterSpeckles(theirs, double(newVal), maxSize, double(diff));
     int bytes = 0;
     ASSERT_EQ(zeliMarkSpecklesGetBufferSize({w, h}, type, &bytes), 0);
-    std::vector<Zel8u> buf(size_t(bytes));
+    std::vector<Zel8u> buf(static_cast<size_t>(bytes));
     ASSERT_EQ(fn(ours.ptr<T>(), int(ours.step), {w, h}, newVal, maxSize, T(diff), zelNormInf, buf.data()), 0);
     ASSERT_EQ(cv::countNonZero(theirs != ours), 0) << w << " x " << h << " size " << maxSize << " diff " << diff;
   }
@@ -104,7 +104,7 @@ TEST(Segmentation, WatershedBasinsMatchOnPlateauFreeReliefs) {
     cv::watershed(colour, theirs);
     int bytes = 0;
     ASSERT_EQ(zeliSegmentWatershedGetBufferSize_8u_C1R({w, h}, &bytes), 0);
-    std::vector<Zel8u> buf(size_t(bytes));
+    std::vector<Zel8u> buf(static_cast<size_t>(bytes));
     ASSERT_EQ(zeliSegmentWatershed_8u_C1IR(relief.data, int(relief.step), ours.data, int(ours.step), {w, h},
                                            zelNormL1, zelSegmentLines, buf.data()),
               0);
@@ -155,7 +155,9 @@ TEST(Segmentation, InpaintingIsCloseToFastMarchingInpaint) {
     zeliInpaintFree_8u_C1R(state);
     for (int y = 0; y < h; ++y)
       for (int x = 0; x < w * ch; ++x)
-        if (!mask.at<uint8_t>(y, x / ch)) ASSERT_EQ(ours.ptr<uint8_t>(y)[x], img.ptr<uint8_t>(y)[x]);
+        if (!mask.at<uint8_t>(y, x / ch)) {
+          ASSERT_EQ(ours.ptr<uint8_t>(y)[x], img.ptr<uint8_t>(y)[x]);
+        }
     cv::Mat d;
     cv::absdiff(ours, theirs, d);
     const double meanDiff = cv::mean(d, mask)[0];
