@@ -166,18 +166,23 @@ ZELCV_API ZelStatus ZELCV_CALL zeliBoundSegments_32s_C1IR(Zel32s* markers, int m
  * (outside the mask, or filled before p) with 0 < |p - q|^2 <= radius^2:
  *   I(p) = sum w (I(q) + g(q) . (p - q)) / sum w, with
  *   w = max(|n . (p - q)| / |p - q|, 1e-6) / |p - q|^2 / (1 + |T(q) - T(p)|),
- *   n the unit vector of T's central-difference gradient at p (0 when that
- *   gradient is 0), and g(q) I's gradient at q by central differences over
+ *   n the unit vector of T's central-difference gradient at p (one-sided at
+ *   the ROI edge; 0 when that gradient is 0), and g(q) I's gradient at q by central differences over
  *   known pixels (a one-sided difference where one side is unknown or outside
  *   the ROI, 0 where both are); per channel in single precision, then
- *   rounded to nearest and saturated to 0..255.
+ *   clamped to 0..255 and rounded half up.
  * Only the unknown pixels of dst change from src; src is only read (dst may
  * be src, with the same step).
- * The state is one block, released by zeliInpaintFree_8u_C1R or _C3R. The
- * block holds about 12 w h bytes plus 4 bytes per unknown pixel.
+ * A mask covering the whole ROI has no edge: nothing is filled.
+ * The state is one block, released by zeliInpaintFree_8u_C1R or _C3R: a
+ * 64-byte head, 8 w h bytes of distances and fill ranks, 4 bytes per unknown
+ * pixel and 16 per offset of the radius disc (each part rounded up to 16).
+ * InitAlloc also allocates, and frees before returning, 11 w h + 16 bytes of
+ * scratch for the march.
  * InitAlloc checks, in order: null mask or state -8; w or h < 1 -6; maskStep
- * < w -14; a state larger than INT_MAX bytes -6; radius outside [1, 64] (or
- * NaN) -5; an allocation failure -9 (*state unchanged).
+ * < w -14; radius outside [1, 64] (or NaN) -5; a ROI for which the state with
+ * every pixel unknown, or the scratch, exceeds INT_MAX bytes -6; an
+ * allocation failure -9 (everything released, *state unchanged).
  * Inpaint checks, in order: null src, dst or state -8; w or h < 1 -6; a step
  * below w x channels -14; a state of another kind -17, built for the other
  * channel count -53, or for another ROI size -6. */
