@@ -57,7 +57,8 @@ std::pair<int, int> randomSize(std::mt19937& rng, int i) {
 TEST(LabelMarkers, EveryFormMatchesThePixelUnionFind) {
   std::mt19937 rng(2401);
   for (int i = 0; i < 160; ++i) {
-    const auto [w, h] = randomSize(rng, i);
+    const std::pair<int, int> size = randomSize(rng, i);
+    const int w = size.first, h = size.second;
     const int values = 1 + int(rng() % 4);
     const Grid g = zeltest::blobGrid(rng, w, h, values);
     const int norm = rng() % 2 ? zelNormInf : zelNormL1;
@@ -147,7 +148,8 @@ void checkSpeckles(ZelStatus (*fn)(T*, int, ZeliSize, T, int, T, int, Zel8u*), Z
                    T lo, T hi, T maxDiffTop) {
   std::mt19937 rng(seed);
   for (int i = 0; i < 120; ++i) {
-    const auto [w, h] = randomSize(rng, i);
+    const std::pair<int, int> size = randomSize(rng, i);
+    const int w = size.first, h = size.second;
     // Few distinct levels plus noise so that joins and breaks both occur.
     std::vector<T> values(size_t(w) * h);
     const int levels = 1 + int(rng() % 4);
@@ -225,7 +227,8 @@ void checkFlood(bool watershed, int channels, uint32_t seed) {
   std::mt19937 rng(seed);
   const int64_t boundary = int64_t(M(~M(0)));
   for (int i = 0; i < 150; ++i) {
-    const auto [w, h] = randomSize(rng, i);
+    const std::pair<int, int> size = randomSize(rng, i);
+    const int w = size.first, h = size.second;
     // Smooth reliefs with ties and rough ones.
     TestImage<Zel8u> src(layoutOf(rng, w, h, 1, channels));
     const int coarse = 1 + int(rng() % 60);
@@ -310,7 +313,8 @@ template <typename T>
 void checkBounds(ZelStatus (*fn)(T*, int, ZeliSize, T, int), uint32_t seed, T val) {
   std::mt19937 rng(seed);
   for (int i = 0; i < 200; ++i) {
-    const auto [w, h] = randomSize(rng, i);
+    const std::pair<int, int> size = randomSize(rng, i);
+    const int w = size.first, h = size.second;
     Grid g = zeltest::blobGrid(rng, w, h, 1 + int(rng() % 3));
     if (sizeof(T) > 1)
       for (auto& v : g.v) v *= 20000;  // values that differ only above the low byte
