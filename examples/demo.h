@@ -36,5 +36,6 @@ int demoFilters(const DemoImage* image, const char* outDir);
 int demoStatistics(const DemoImage* image, const char* outDir);
 int demoUndistort(const DemoImage* image, const char* outDir);
 int demoOptFlow(const DemoImage* image, const char* outDir);
+int demoSegmentation(const DemoImage* image, const char* outDir);
 
 #endif

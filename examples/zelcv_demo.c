@@ -40,6 +40,7 @@ int main(int argc, char** argv) {
   failures |= demoStatistics(&image, outDir);
   failures |= demoUndistort(&image, outDir);
   failures |= demoOptFlow(&image, outDir);
+  failures |= demoSegmentation(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

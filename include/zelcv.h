@@ -24,5 +24,6 @@
 #include "zelcv/statistics.h"
 #include "zelcv/undistort.h"
 #include "zelcv/optflow.h"
+#include "zelcv/segmentation.h"
 
 #endif /* ZELCV_H */
