@@ -120,8 +120,9 @@ ZELCV_API ZelStatus ZELCV_CALL zeliTiltHaarFeatures_32s(const Zel8u* mask, ZeliH
  * Checks: null src (tilt), norm, mask, positiveCount or classifier -8;
  * w or h < 1 -6; srcStep (tiltStep) < (w + size.width) x 4, normStep < 4w or
  * maskStep < w -14; a src, tilt or norm step not a multiple of 4 -108; then
- * a classifier holding tilted features passed to ApplyHaarClassifier -17.
- * Nothing is written on failure. */
+ * a classifier holding tilted features passed to ApplyHaarClassifier, or
+ * one of the other element type, -17. Nothing is written on failure. A
+ * count above INT_MAX is written as INT_MAX. */
 ZELCV_API ZelStatus ZELCV_CALL zeliApplyHaarClassifier_32f_C1R(const Zel32f* src, int srcStep, const Zel32f* norm,
                                                                int normStep, Zel8u* mask, int maskStep,
                                                                ZeliSize roiSize, int* positiveCount,
