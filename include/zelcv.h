@@ -25,5 +25,6 @@
 #include "zelcv/undistort.h"
 #include "zelcv/optflow.h"
 #include "zelcv/segmentation.h"
+#include "zelcv/haar.h"
 
 #endif /* ZELCV_H */

@@ -10,7 +10,8 @@ cd "$(dirname "$0")/.."
 
 # OpenCV is a test dependency: the conformity tests compare results with it.
 # clang and its runtime build the fuzz targets (libFuzzer) of the sanitizer run.
-packages=(build-essential clang cmake g++-multilib libclang-rt-dev libgtest-dev libopencv-dev pkg-config
+# opencv-data holds the stock Haar cascades that the classifier tests convert.
+packages=(build-essential clang cmake g++-multilib libclang-rt-dev libgtest-dev libopencv-dev opencv-data pkg-config
           g++-mingw-w64-x86-64-posix g++-mingw-w64-i686-posix wine64)
 if [[ "${1:-}" == "--bench" ]]; then
   packages+=(libbenchmark-dev)
@@ -45,4 +46,20 @@ if ! installed wine32:i386 && [[ ! -e build/.no-wine32 ]]; then
     mv build-wine32.log build/.no-wine32
   fi
   rm -f build-wine32.log
+fi
+
+# The sample photograph of the Haar classifier tests, benchmarks and demo:
+# python3-skimage ships it; take the file alone, without the package's Python
+# dependencies.
+photo=build/testdata/astronaut.png
+if [[ ! -e $photo ]]; then
+  echo "Extracting: $photo (from python3-skimage)"
+  mkdir -p build/testdata
+  tmp=$(mktemp -d)
+  if (cd "$tmp" && apt-get download python3-skimage > /dev/null 2>&1) && dpkg -x "$tmp"/python3-skimage_*.deb "$tmp/x"; then
+    cp "$(find "$tmp/x" -path '*skimage/data/astronaut.png' | head -n 1)" "$photo"
+  else
+    echo "python3-skimage could not be downloaded: the face tests will fail until $photo exists"
+  fi
+  rm -rf "$tmp"
 fi
