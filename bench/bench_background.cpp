@@ -1,6 +1,7 @@
 // The mixture model per frame against cv::BackgroundSubtractorMOG2::apply
 // (shadows off, the same number of components, one thread), on a noisy
 // frame sequence so that both models keep working every frame.
+#include <opencv2/imgproc.hpp>
 #include <opencv2/video/background_segm.hpp>
 
 #include "harness.h"
