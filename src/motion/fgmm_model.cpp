@@ -83,14 +83,18 @@ inline __m128 processGroup(float* g, const __m128* x, const FrameConstants& f) {
   for (int k = 0; k < K; ++k) {
     const __m128 v = _mm_load_ps(g + k * kFields * 4 + 16);
     const __m128 used = _mm_cmpgt_ps(w[k], f.zero);
-    __m128 ranked = f.zero;
-    for (int j = 0; j < K; ++j) {
-      if (j == k) continue;
-      const __m128 before = j < k ? _mm_cmpge_ps(w[j], w[k]) : _mm_cmpgt_ps(w[j], w[k]);
-      ranked = _mm_add_ps(ranked, _mm_and_ps(before, w[j]));
-    }
     const __m128 close = _mm_and_ps(used, _mm_cmplt_ps(dist[k], _mm_mul_ps(f.tb, v)));
-    background = _mm_or_ps(background, _mm_and_ps(close, _mm_cmplt_ps(ranked, f.ratio)));
+    // The rank sum only matters where the component is close; usually one
+    // component per pixel is, so most groups skip most sums.
+    if (_mm_movemask_ps(close)) {
+      __m128 ranked = f.zero;
+      for (int j = 0; j < K; ++j) {
+        if (j == k) continue;
+        const __m128 before = j < k ? _mm_cmpge_ps(w[j], w[k]) : _mm_cmpgt_ps(w[j], w[k]);
+        ranked = _mm_add_ps(ranked, _mm_and_ps(before, w[j]));
+      }
+      background = _mm_or_ps(background, _mm_and_ps(close, _mm_cmplt_ps(ranked, f.ratio)));
+    }
     const __m128 take =
         _mm_and_ps(_mm_and_ps(used, _mm_cmplt_ps(dist[k], _mm_mul_ps(f.tg, v))), _mm_cmpgt_ps(w[k], bestW));
     bestW = blend(take, w[k], bestW);
