@@ -37,5 +37,6 @@ int demoStatistics(const DemoImage* image, const char* outDir);
 int demoUndistort(const DemoImage* image, const char* outDir);
 int demoOptFlow(const DemoImage* image, const char* outDir);
 int demoSegmentation(const DemoImage* image, const char* outDir);
+int demoBackground(const DemoImage* image, const char* outDir);
 
 #endif

@@ -41,6 +41,7 @@ int main(int argc, char** argv) {
   failures |= demoUndistort(&image, outDir);
   failures |= demoOptFlow(&image, outDir);
   failures |= demoSegmentation(&image, outDir);
+  failures |= demoBackground(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

@@ -26,5 +26,6 @@
 #include "zelcv/optflow.h"
 #include "zelcv/segmentation.h"
 #include "zelcv/haar.h"
+#include "zelcv/background.h"
 
 #endif /* ZELCV_H */
