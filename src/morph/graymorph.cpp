@@ -29,14 +29,14 @@ struct GrayHeader {
   int32_t maskWidth, maskHeight, anchorX, anchorY;
   int32_t maxRoiWidth;
   int32_t ringStride;  // bytes of one extended row, a multiple of 32
-  int32_t reserved;
+  int32_t groups[3];   // elements of value 0, of the first and of the second kind
 };
 constexpr int kHeaderBytes = 64;
 static_assert(sizeof(GrayHeader) <= kHeaderBytes, "header slot");
 
 // The parts of a state, from its aligned start.
 struct Layout {
-  int64_t ringStride, elementPointers, rowPointers, values, ring, total;
+  int64_t ringStride, elementPointers, rowPointers, order, values, ring, total;
 };
 
 Layout layoutFor(int64_t roiWidth, int64_t mw, int64_t mh, int64_t elementSize) {
@@ -45,7 +45,8 @@ Layout layoutFor(int64_t roiWidth, int64_t mw, int64_t mh, int64_t elementSize) 
   l.ringStride = alignSize(SizeCalc(roiWidth + mw - 1) * SizeCalc(elementSize), 32).value();
   l.elementPointers = kHeaderBytes;                       // area pointer slots of 8 bytes
   l.rowPointers = l.elementPointers + 8 * area;           // mh pointer slots
-  l.values = alignSize(l.rowPointers + 8 * mh, int64_t(32));  // area ElementValues
+  l.order = l.rowPointers + 8 * mh;                          // area int32 element indices
+  l.values = alignSize(l.order + 4 * area, int64_t(32));      // area ElementValues, in that order
   l.ring = l.values + 32 * area;
   l.total = (SizeCalc(l.ring) + SizeCalc(mh) * SizeCalc(l.ringStride)).value();
   return l;
@@ -115,13 +116,35 @@ ZelStatus build(int dataType, int elementSize, int roiWidth, const V* mask, Zeli
   }
   const Layout l = layoutFor(roiWidth, maskSize.width, maskSize.height, elementSize);
   uint8_t* base = stateStart(block);
-  const GrayHeader h = {dataType, maskSize.width, maskSize.height, anchor.x, anchor.y, roiWidth,
-                        int32_t(l.ringStride), 0};
+  GrayHeader h = {dataType, maskSize.width, maskSize.height, anchor.x, anchor.y, roiWidth, int32_t(l.ringStride),
+                  {0, 0, 0}};
+  // 8u elements are kept in three groups, each in row-major order: value 0
+  // (the pixel itself), positive (one saturating addition) and negative
+  // (one saturating subtraction); integer maxima do not depend on the
+  // order. 32f keeps row-major order, which decides between equal terms.
+  auto* order = reinterpret_cast<int32_t*>(base + l.order);
+  auto* values = reinterpret_cast<ElementValue*>(base + l.values);
+  const int32_t area = maskSize.width * maskSize.height;
+  int32_t k = 0;
+  if (dataType == zel8u) {
+    for (int group = 0; group < 3; ++group)
+      for (int32_t e = 0; e < area; ++e) {
+        const int64_t v = int64_t(mask[e]);
+        if ((group == 0 && v == 0) || (group == 1 && v > 0) || (group == 2 && v < 0)) {
+          order[k] = e;
+          values[k++] = valueOf(mask[e]);
+          ++h.groups[group];
+        }
+      }
+  } else {
+    for (; k < area; ++k) {
+      order[k] = k;
+      values[k] = valueOf(mask[k]);
+    }
+    h.groups[1] = area;
+  }
   memset(base, 0, kHeaderBytes);
   memcpy(base, &h, sizeof h);
-  auto* values = reinterpret_cast<ElementValue*>(base + l.values);
-  const int64_t area = int64_t(maskSize.width) * maskSize.height;
-  for (int64_t k = 0; k < area; ++k) values[k] = valueOf(mask[k]);
   return zelStatusOk;
 }
 
@@ -131,13 +154,14 @@ int typeCode() {
 }
 
 template <typename T>
-void rowKernel(bool dilate, const T* const* sources, const ElementValue* values, int count, T* dst, int width) {
+void rowKernel(bool dilate, const T* const* sources, const ElementValue* values, const int* groups, T* dst,
+               int width) {
   withChosenIsa<IsaLevel::Avx2>([&](auto tag) {
     using Isa = typename decltype(tag)::Isa;
     if constexpr (std::is_same<Isa, simd::Sse2>::value)
-      graymorph::row<T, simd::Sse2>(dilate, sources, values, count, dst, width);
+      graymorph::row<T, simd::Sse2>(dilate, sources, values, groups, dst, width);
     else
-      graymorph::rowAvx2(dilate, sources, values, count, dst, width);
+      graymorph::rowAvx2(dilate, sources, values, groups, dst, width);
   });
 }
 
@@ -162,6 +186,7 @@ void run(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize r
   const Layout l = layoutFor(h.maxRoiWidth, mw, mh, sizeof(T));
   auto** sources = reinterpret_cast<const T**>(base + l.elementPointers);
   auto** rows = reinterpret_cast<T**>(base + l.rowPointers);
+  const auto* order = reinterpret_cast<const int32_t*>(base + l.order);
   const auto* values = reinterpret_cast<const ElementValue*>(base + l.values);
   uint8_t* ring = base + l.ring;
   const int right = mw - 1 - ax;
@@ -175,10 +200,9 @@ void run(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize r
     const int64_t last = int64_t(y) - ay + mh - 1;
     extendRow(src, srcStep, roi, border, int(last), ax, right, slotRow(last));
     for (int j = 0; j < mh; ++j) rows[j] = slotRow(int64_t(y) - ay + j);
-    for (int j = 0, k = 0; j < mh; ++j)
-      for (int i = 0; i < mw; ++i, ++k) sources[k] = rows[j] + i;
+    for (int k = 0; k < count; ++k) sources[k] = rows[order[k] / mw] + order[k] % mw;
     T* out = reinterpret_cast<T*>(reinterpret_cast<uint8_t*>(dst) + int64_t(y) * dstStep);
-    rowKernel<T>(dilate, sources, values, count, out, roi.width);
+    rowKernel<T>(dilate, sources, values, h.groups, out, roi.width);
   }
 }
 

@@ -20,8 +20,12 @@ template <> struct Ops<uint8_t, avx2::Isa> {
     return _mm256_broadcastsi128_si256(_mm_load_si128(reinterpret_cast<const __m128i*>(e.bytes + 16)));
   }
   static V start(bool dilate) { return _mm256_set1_epi8(dilate ? 0 : -1); }
-  static V termDilate(V s, V add, V sub) { return _mm256_subs_epu8(_mm256_adds_epu8(s, add), sub); }
-  static V termErode(V s, V add, V sub) { return _mm256_subs_epu8(_mm256_adds_epu8(s, sub), add); }
+  template <bool kDilate> static V firstTerm(V s, V add, V) {
+    return kDilate ? _mm256_adds_epu8(s, add) : _mm256_subs_epu8(s, add);
+  }
+  template <bool kDilate> static V secondTerm(V s, V, V sub) {
+    return kDilate ? _mm256_subs_epu8(s, sub) : _mm256_adds_epu8(s, sub);
+  }
   static V keepMax(V t, V acc) { return _mm256_max_epu8(t, acc); }
   static V keepMin(V t, V acc) { return _mm256_min_epu8(t, acc); }
 };
@@ -38,20 +42,20 @@ template <> struct Ops<float, avx2::Isa> {
   static V start(bool dilate) {
     return _mm256_set1_ps(dilate ? -__builtin_huge_valf() : __builtin_huge_valf());
   }
-  static V termDilate(V s, V v, V) { return _mm256_add_ps(s, v); }
-  static V termErode(V s, V, V negV) { return _mm256_add_ps(s, negV); }
+  template <bool kDilate> static V firstTerm(V s, V v, V negV) { return _mm256_add_ps(s, kDilate ? v : negV); }
+  template <bool kDilate> static V secondTerm(V s, V v, V negV) { return firstTerm<kDilate>(s, v, negV); }
   static V keepMax(V t, V acc) { return _mm256_max_ps(t, acc); }
   static V keepMin(V t, V acc) { return _mm256_min_ps(t, acc); }
 };
 
-void rowAvx2(bool dilate, const uint8_t* const* sources, const ElementValue* values, int count, uint8_t* dst,
-             int width) {
-  row<uint8_t, avx2::Isa>(dilate, sources, values, count, dst, width);
+void rowAvx2(bool dilate, const uint8_t* const* sources, const ElementValue* values, const int* groups,
+             uint8_t* dst, int width) {
+  row<uint8_t, avx2::Isa>(dilate, sources, values, groups, dst, width);
 }
 
-void rowAvx2(bool dilate, const float* const* sources, const ElementValue* values, int count, float* dst,
+void rowAvx2(bool dilate, const float* const* sources, const ElementValue* values, const int* groups, float* dst,
              int width) {
-  row<float, avx2::Isa>(dilate, sources, values, count, dst, width);
+  row<float, avx2::Isa>(dilate, sources, values, groups, dst, width);
 }
 
 }  // namespace graymorph

@@ -85,8 +85,14 @@ template <> struct Ops<uint8_t, simd::Sse2> {
     return _mm_load_si128(reinterpret_cast<const __m128i*>(e.bytes + 16));
   }
   static V start(bool dilate) { return _mm_set1_epi8(dilate ? 0 : -1); }
-  static V termDilate(V s, V add, V sub) { return _mm_subs_epu8(_mm_adds_epu8(s, add), sub); }
-  static V termErode(V s, V add, V sub) { return _mm_subs_epu8(_mm_adds_epu8(s, sub), add); }
+  // Positive values (first part only): s + v, or s - v for erosion;
+  // negative values (second part only): s - |v|, or s + |v|.
+  template <bool kDilate> static V firstTerm(V s, V add, V) {
+    return kDilate ? _mm_adds_epu8(s, add) : _mm_subs_epu8(s, add);
+  }
+  template <bool kDilate> static V secondTerm(V s, V, V sub) {
+    return kDilate ? _mm_subs_epu8(s, sub) : _mm_adds_epu8(s, sub);
+  }
   static V keepMax(V t, V acc) { return _mm_max_epu8(t, acc); }
   static V keepMin(V t, V acc) { return _mm_min_epu8(t, acc); }
 };
@@ -99,66 +105,74 @@ template <> struct Ops<float, simd::Sse2> {
   static V first(const ElementValue& e) { return _mm_load_ps(reinterpret_cast<const float*>(e.bytes)); }
   static V second(const ElementValue& e) { return _mm_load_ps(reinterpret_cast<const float*>(e.bytes + 16)); }
   static V start(bool dilate) { return _mm_set1_ps(dilate ? -__builtin_huge_valf() : __builtin_huge_valf()); }
-  // s + v and s + (-v): the same bits as s - v.
-  static V termDilate(V s, V v, V) { return _mm_add_ps(s, v); }
-  static V termErode(V s, V, V negV) { return _mm_add_ps(s, negV); }
+  // s + v, or s + (-v): the same bits as s - v. Every element is in the
+  // first group.
+  template <bool kDilate> static V firstTerm(V s, V v, V negV) { return _mm_add_ps(s, kDilate ? v : negV); }
+  template <bool kDilate> static V secondTerm(V s, V v, V negV) { return firstTerm<kDilate>(s, v, negV); }
   // (t > acc) ? t : acc, and (t < acc) ? t : acc: NaN terms leave acc.
   static V keepMax(V t, V acc) { return _mm_max_ps(t, acc); }
   static V keepMin(V t, V acc) { return _mm_min_ps(t, acc); }
 };
 
-// Four vectors of output per pass over the elements, then single vectors,
-// then the last vector again overlapping (its pixels get the same values).
-template <typename T, typename Isa, bool kDilate>
-void rowVector(const T* const* sources, const ElementValue* values, int count, T* dst, int width) {
+// The elements come in three groups: groups[0] of value 0, then groups[1]
+// that need only the first part of their value, then groups[2] that need
+// only the second (8u: positive, then negative values; 32f puts every
+// element in the middle group, whose term is the full sum).
+template <typename T, typename Isa, bool kDilate, int N>
+inline void block(const T* const* sources, const ElementValue* values, const int* groups, T* dst, int x) {
   using O = Ops<T, Isa>;
   using V = typename O::V;
   constexpr int L = O::kLanes;
-  auto term = [](V s, V a, V b) { return kDilate ? O::termDilate(s, a, b) : O::termErode(s, a, b); };
   auto keep = [](V t, V acc) { return kDilate ? O::keepMax(t, acc) : O::keepMin(t, acc); };
-  int x = 0;
-  for (; x + 4 * L <= width; x += 4 * L) {
-    V a0 = O::start(kDilate), a1 = a0, a2 = a0, a3 = a0;
-    for (int k = 0; k < count; ++k) {
-      const T* s = sources[k] + x;
-      const V p = O::first(values[k]), q = O::second(values[k]);
-      a0 = keep(term(O::load(s), p, q), a0);
-      a1 = keep(term(O::load(s + L), p, q), a1);
-      a2 = keep(term(O::load(s + 2 * L), p, q), a2);
-      a3 = keep(term(O::load(s + 3 * L), p, q), a3);
-    }
-    O::store(dst + x, a0);
-    O::store(dst + x + L, a1);
-    O::store(dst + x + 2 * L, a2);
-    O::store(dst + x + 3 * L, a3);
+  V a[N];
+  for (int n = 0; n < N; ++n) a[n] = O::start(kDilate);
+  const int zeroEnd = groups[0], firstEnd = zeroEnd + groups[1], end = firstEnd + groups[2];
+  int k = 0;
+  for (; k < zeroEnd; ++k)
+    for (int n = 0; n < N; ++n) a[n] = keep(O::load(sources[k] + x + n * L), a[n]);
+  for (; k < firstEnd; ++k) {
+    const V p = O::first(values[k]), q = O::second(values[k]);
+    for (int n = 0; n < N; ++n) a[n] = keep(O::template firstTerm<kDilate>(O::load(sources[k] + x + n * L), p, q), a[n]);
   }
+  for (; k < end; ++k) {
+    const V p = O::first(values[k]), q = O::second(values[k]);
+    for (int n = 0; n < N; ++n) a[n] = keep(O::template secondTerm<kDilate>(O::load(sources[k] + x + n * L), p, q), a[n]);
+  }
+  for (int n = 0; n < N; ++n) O::store(dst + x + n * L, a[n]);
+}
+
+// Four vectors of output per pass over the elements, then single vectors,
+// then the last vector again overlapping (its pixels get the same values).
+template <typename T, typename Isa, bool kDilate>
+void rowVector(const T* const* sources, const ElementValue* values, const int* groups, T* dst, int width) {
+  constexpr int L = Ops<T, Isa>::kLanes;
+  int x = 0;
+  for (; x + 4 * L <= width; x += 4 * L) block<T, Isa, kDilate, 4>(sources, values, groups, dst, x);
   for (;; x += L) {
     if (x + L > width) {
       if (x == width) return;
       x = width - L;
     }
-    V a = O::start(kDilate);
-    for (int k = 0; k < count; ++k) a = keep(term(O::load(sources[k] + x), O::first(values[k]), O::second(values[k])), a);
-    O::store(dst + x, a);
+    block<T, Isa, kDilate, 1>(sources, values, groups, dst, x);
     if (x + L == width) return;
   }
 }
 
 template <typename T, typename Isa>
-void row(bool dilate, const T* const* sources, const ElementValue* values, int count, T* dst, int width) {
+void row(bool dilate, const T* const* sources, const ElementValue* values, const int* groups, T* dst, int width) {
   if (width < Ops<T, Isa>::kLanes) {
-    rowScalar(dilate, sources, values, count, dst, 0, width);
+    rowScalar(dilate, sources, values, groups[0] + groups[1] + groups[2], dst, 0, width);
   } else if (dilate) {
-    rowVector<T, Isa, true>(sources, values, count, dst, width);
+    rowVector<T, Isa, true>(sources, values, groups, dst, width);
   } else {
-    rowVector<T, Isa, false>(sources, values, count, dst, width);
+    rowVector<T, Isa, false>(sources, values, groups, dst, width);
   }
 }
 
 // The AVX2 forms, built in graymorph_avx2.cpp.
-void rowAvx2(bool dilate, const uint8_t* const* sources, const ElementValue* values, int count, uint8_t* dst,
-             int width);
-void rowAvx2(bool dilate, const float* const* sources, const ElementValue* values, int count, float* dst,
+void rowAvx2(bool dilate, const uint8_t* const* sources, const ElementValue* values, const int* groups,
+             uint8_t* dst, int width);
+void rowAvx2(bool dilate, const float* const* sources, const ElementValue* values, const int* groups, float* dst,
              int width);
 
 }  // namespace graymorph
