@@ -38,5 +38,6 @@ int demoUndistort(const DemoImage* image, const char* outDir);
 int demoOptFlow(const DemoImage* image, const char* outDir);
 int demoSegmentation(const DemoImage* image, const char* outDir);
 int demoBackground(const DemoImage* image, const char* outDir);
+int demoGrayMorph(const DemoImage* image, const char* outDir);
 
 #endif

@@ -33,6 +33,7 @@ int main(int argc, char** argv) {
   failures |= demoFilter(&image, outDir);
   failures |= demoMorph(&image, outDir);
   failures |= demoMorphAdv(&image, outDir);
+  failures |= demoGrayMorph(&image, outDir);
   failures |= demoFloodFill(&image, outDir);
   failures |= demoPyramid(&image, outDir);
   failures |= demoDistance(&image, outDir);

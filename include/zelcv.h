@@ -16,6 +16,7 @@
 #include "zelcv/canny.h"
 #include "zelcv/morphology.h"
 #include "zelcv/morph_adv.h"
+#include "zelcv/gray_morphology.h"
 #include "zelcv/integral.h"
 #include "zelcv/floodfill.h"
 #include "zelcv/pyramid.h"
