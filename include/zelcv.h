@@ -22,5 +22,6 @@
 #include "zelcv/distance.h"
 #include "zelcv/filters.h"
 #include "zelcv/statistics.h"
+#include "zelcv/features.h"
 
 #endif /* ZELCV_H */
