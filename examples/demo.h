@@ -34,5 +34,6 @@ int demoPyramid(const DemoImage* image, const char* outDir);
 int demoDistance(const DemoImage* image, const char* outDir);
 int demoFilters(const DemoImage* image, const char* outDir);
 int demoStatistics(const DemoImage* image, const char* outDir);
+int demoFeatures(const DemoImage* image, const char* outDir);
 
 #endif

@@ -38,6 +38,7 @@ int main(int argc, char** argv) {
   failures |= demoDistance(&image, outDir);
   failures |= demoFilters(&image, outDir);
   failures |= demoStatistics(&image, outDir);
+  failures |= demoFeatures(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

@@ -70,8 +70,9 @@ ZELCV_ENTRY(zeliLineSuppression_8u_C1R)(const Zel8u* src, int srcStep, const Zel
   const double r = double(ratio), r1 = (r + 1.0) * (r + 1.0);
   for (int y = 0; y < half && y < h; ++y) enter(y);
   for (int y = 0; y < h; ++y) {
-    if (y + half < h) enter(y + half);
+    // The leaving row's slot is the one the entering row takes.
     if (y - half - 1 >= 0) leave(y - half - 1);
+    if (y + half < h) enter(y + half);
     const Zel8u* f = feature + ptrdiff_t(y) * featureStep;
     Zel8u* out = dst + ptrdiff_t(y) * dstStep;
     int64_t sxx = 0, sxy = 0, syy = 0;
