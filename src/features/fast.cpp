@@ -49,6 +49,17 @@ void scoreRow(const fast::Circle& circle, const Zel8u* row, int srcStep, int wid
       bits &= bits - 1;
     }
   }
+  if (x < width - r && width - 2 * r >= 16) {
+    // The last sixteen centres, overlapping those already done.
+    const int last = width - r - 16;
+    int bits = fast::corners16(circle, row + last, srcStep, threshold, arc) >> (x - last);
+    while (bits) {
+      const int b = __builtin_ctz(unsigned(bits));
+      out[x + b] = Zel8u(fast::score(circle, row + x + b, srcStep, arc) + 1);
+      bits &= bits - 1;
+    }
+    x = width - r;
+  }
   for (; x < width - r; ++x)
     if (fast::isCorner(circle, row + x, srcStep, threshold, arc))
       out[x] = Zel8u(fast::score(circle, row + x, srcStep, arc) + 1);
@@ -121,6 +132,14 @@ ZELCV_ENTRY(zeliFastN_8u_C1R)(const Zel8u* src, int srcStep, Zel8u* dstCorner, i
     std::memset(corner, 0, size_t(w));
     std::memset(score, 0, size_t(w));
     for (int x = 0; x < w; ++x) {
+      // Sixteen pixels without a corner at once.
+      if (x + 16 <= w && !_mm_movemask_epi8(_mm_cmpeq_epi8(
+                             _mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(mid + x)),
+                                            _mm_setzero_si128()),
+                             _mm_setzero_si128()))) {
+        x += 15;
+        continue;
+      }
       if (!mid[x]) continue;
       const int s = mid[x] - 1;
       if (st->suppression) {
@@ -148,6 +167,12 @@ ZELCV_ENTRY(zeliFastN2DToVec_8u)(const Zel8u* srcCorner, int srcCornerStep, cons
     const Zel8u* c = srcCorner + ptrdiff_t(y) * srcCornerStep;
     const Zel8u* s = srcScore + ptrdiff_t(y) * srcScoreStep;
     for (int x = 0; x < roiSize.width; ++x) {
+      if (x + 16 <= roiSize.width &&
+          _mm_movemask_epi8(_mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(c + x)),
+                                           _mm_setzero_si128())) == 0xFFFF) {
+        x += 15;
+        continue;
+      }
       if (!c[x]) continue;
       if (written == capacity) {
         *count = written;

@@ -56,21 +56,25 @@ inline bool isCorner(const Circle& c, const Zel8u* centre, int /*step*/, int thr
 }
 
 // (the largest, over both kinds and every arc, of the arc's smallest
-// difference) - 1.
+// difference) - 1. The smallest (largest) difference of every arc comes from
+// runs doubled in length: runs of 2, 4, ... up to the largest power of two p
+// <= arc, and an arc is two overlapping runs of p.
 inline int score(const Circle& c, const Zel8u* centre, int /*step*/, int arc) {
-  const int v = *centre;
-  int d[16];
-  for (int k = 0; k < c.n; ++k) d[k] = centre[c.offset[k]] - v;
-  int best = INT32_MIN;
-  for (int s = 0; s < c.n; ++s) {
-    int lo = INT32_MAX, hi = INT32_MIN;  // smallest p - v, largest p - v on the arc
-    for (int i = 0; i < arc; ++i) {
-      const int e = d[(s + i) % c.n];
-      lo = e < lo ? e : lo;
-      hi = e > hi ? e : hi;
+  const int v = *centre, n = c.n;
+  int lo[32], hi[32];  // cyclic runs, doubled in place; 2n entries
+  for (int k = 0; k < n; ++k) lo[k] = hi[k] = lo[k + n] = hi[k + n] = centre[c.offset[k]] - v;
+  int p = 1;
+  for (; 2 * p <= arc; p *= 2)
+    for (int k = 0; k + p < 2 * n; ++k) {
+      lo[k] = lo[k] < lo[k + p] ? lo[k] : lo[k + p];
+      hi[k] = hi[k] > hi[k + p] ? hi[k] : hi[k + p];
     }
-    best = lo > best ? lo : best;
-    best = -hi > best ? -hi : best;
+  int best = INT32_MIN;
+  for (int k = 0; k < n; ++k) {
+    const int a = lo[k] < lo[k + arc - p] ? lo[k] : lo[k + arc - p];
+    const int b = hi[k] > hi[k + arc - p] ? hi[k] : hi[k + arc - p];
+    best = a > best ? a : best;
+    best = -b > best ? -b : best;
   }
   return best - 1;
 }
@@ -89,15 +93,16 @@ inline int corners16(const Circle& c, const Zel8u* centre, int /*step*/, int thr
     const __m128i p = _mm_loadu_si128(reinterpret_cast<const __m128i*>(centre + c.offset[k]));
     return _mm_xor_si128(_mm_cmpeq_epi8(_mm_subs_epu8(loLimit, p), zero), _mm_set1_epi8(-1));
   };
-  // Compass pixels: a corner has two of them on its arc.
+  // Compass pixels: an arc longer than half the circle covers two
+  // neighbouring ones.
   const int q = c.n / 4;
-  __m128i nb = zero, nd = zero;
-  for (int k = 0; k < c.n; k += q) {
-    nb = _mm_sub_epi8(nb, brighter(k));
-    nd = _mm_sub_epi8(nd, darker(k));
-  }
-  const __m128i one = _mm_set1_epi8(1);
-  const __m128i maybe = _mm_or_si128(_mm_cmpgt_epi8(nb, one), _mm_cmpgt_epi8(nd, one));
+  const __m128i b0 = brighter(0), b1 = brighter(q), b2 = brighter(2 * q), b3 = brighter(3 * q);
+  const __m128i d0 = darker(0), d1 = darker(q), d2 = darker(2 * q), d3 = darker(3 * q);
+  const __m128i maybe = _mm_or_si128(
+      _mm_or_si128(_mm_and_si128(b0, b1), _mm_and_si128(b2, b3)),
+      _mm_or_si128(_mm_or_si128(_mm_and_si128(b1, b2), _mm_and_si128(b3, b0)),
+                   _mm_or_si128(_mm_or_si128(_mm_and_si128(d0, d1), _mm_and_si128(d2, d3)),
+                                _mm_or_si128(_mm_and_si128(d1, d2), _mm_and_si128(d3, d0)))));
   if (!_mm_movemask_epi8(maybe)) return 0;
   __m128i mb[16], md[16];
   for (int k = 0; k < c.n; ++k) {
