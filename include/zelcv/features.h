@@ -202,7 +202,8 @@ ZELCV_API ZelStatus ZELCV_CALL zeliHoughLine_Region_8u32f_C1R(const Zel8u* src, 
  * Init checks: state -8, size -6, delta -5 (non-positive or not finite),
  * state too large -6. Detection checks: pointers -8, size -6, step -14,
  * state not built -17, ROI wider or higher than the state's -6, threshold
- * < 1, lineLength < 0, lineGap < 0 or capacity < 0 -5. */
+ * < 1, lineLength < 0, lineGap < 0 or capacity < 0 -5. State bytes:
+ * 32 + 8 A + 4 A (R + 2) + 9 W H + 16 (A = round(pi / dtheta), R as above). */
 typedef struct ZeliHoughProbState ZeliHoughProbState;
 ZELCV_API ZelStatus ZELCV_CALL zeliHoughProbLineGetSize_8u_C1R(ZeliSize roiSize, ZeliPoint_32f delta,
                                                                int* stateSize);
@@ -220,7 +221,7 @@ ZELCV_API ZelStatus ZELCV_CALL zeliHoughProbLine_8u32f_C1R(const Zel8u* src, int
  * Syy of dx*dx, dx*dy, dy*dy over the window of windowSize x windowSize
  * (odd, 3 .. 31) centred on the pixel, positions outside the ROI left out;
  * with det = Sxx * Syy - Sxy^2 and tr = Sxx + Syy (64-bit integers) the pixel
- * is kept when  ratio * tr^2 < (ratio + 1)^2 * det  (in double), i.e. when
+ * is kept when (r * tr) * tr < ((r + 1) * (r + 1)) * det in double (r = ratio), i.e. when
  * the larger eigenvalue is less than `ratio` (> 1, finite) times the smaller.
  * dst = feature where kept, 0 elsewhere (also where feature is 0).
  * Checks: pointers -8, size -6, steps -14, windowSize -33, ratio -5.
