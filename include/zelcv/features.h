@@ -200,7 +200,8 @@ ZELCV_API ZelStatus ZELCV_CALL zeliHoughLine_Region_8u32f_C1R(const Zel8u* src, 
  * (zelStatusOutputFull if pixels were left to visit) or when the list is
  * empty. The source is not modified.
  * Init checks: state -8, size -6, delta -5 (non-positive or not finite),
- * state too large -6. Detection checks: pointers -8, size -6, step -14,
+ * a side above 32767 or a state beyond INT_MAX -6 (the query likewise).
+ * Detection checks: pointers -8, size -6, step -14,
  * state not built -17, ROI wider or higher than the state's -6, threshold
  * < 1, lineLength < 0, lineGap < 0 or capacity < 0 -5. State bytes:
  * 32 + 8 A + 4 A (R + 2) + 9 W H + 16 (A = round(pi / dtheta), R as above). */

@@ -48,7 +48,11 @@ ProbLayout layoutOf(int64_t angles, int64_t rhos, int64_t width, int64_t height)
   return l;
 }
 
+// The walk keeps a coordinate in 16-bit fixed point inside an int.
+constexpr int kMaxSide = 32767;
+
 int64_t stateBytes(ZeliSize roi, ZeliPoint_32f delta) {
+  if (roi.width > kMaxSide || roi.height > kMaxSide) return int64_t(1) << 40;
   const int64_t r = hough::rhoCells(roi, delta.x), a = hough::angleCount(hough::kPi, delta.y);
   if (r < 0 || a < 1) return int64_t(1) << 40;
   return layoutOf(a, r, roi.width, roi.height).total;

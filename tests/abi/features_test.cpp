@@ -508,6 +508,8 @@ TEST(FeaturesHoughProb, Checks) {
             zelStatusBadArgument);
   EXPECT_EQ(count, -1);
   EXPECT_EQ(zeliHoughProbLineInit_8u32f_C1R({20, 10}, {1.0f, -0.1f}, 3u, st), zelStatusBadArgument);
+  EXPECT_EQ(zeliHoughProbLineInit_8u32f_C1R({32768, 1}, delta, 3u, st), zelStatusBadSize);
+  EXPECT_EQ(zeliHoughProbLineGetSize_8u_C1R({1, 32768}, delta, &bytes), zelStatusBadSize);
 }
 
 // ---- line suppression -------------------------------------------------------------
