@@ -39,5 +39,6 @@ int demoOptFlow(const DemoImage* image, const char* outDir);
 int demoSegmentation(const DemoImage* image, const char* outDir);
 int demoBackground(const DemoImage* image, const char* outDir);
 int demoGrayMorph(const DemoImage* image, const char* outDir);
+int demoFeatures(const DemoImage* image, const char* outDir);
 
 #endif

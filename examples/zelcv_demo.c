@@ -43,6 +43,7 @@ int main(int argc, char** argv) {
   failures |= demoOptFlow(&image, outDir);
   failures |= demoSegmentation(&image, outDir);
   failures |= demoBackground(&image, outDir);
+  failures |= demoFeatures(&image, outDir);
   demoFreeImage(&image);
   return failures ? EXIT_FAILURE : EXIT_SUCCESS;
 }

@@ -28,5 +28,6 @@
 #include "zelcv/segmentation.h"
 #include "zelcv/haar.h"
 #include "zelcv/background.h"
+#include "zelcv/features.h"
 
 #endif /* ZELCV_H */

@@ -64,6 +64,30 @@ class DerivativeRows {
 int64_t scharr32fBufferBytes(int width);
 void scharr32f(const Zel32f* src, int srcStep, ZeliSize roi, ZeliBorderType border, Zel32f* dx, int dxStep,
                Zel32f* dy, int dyStep, Zel8u* buffer);
+// The same derivatives of 32f images, in float: per column the column taps
+// over rows y - r .. y + r (tap 0 first, a multiplication and an addition per
+// non-zero tap), then the row taps over those column values in the same way.
+// Every path gives the same bits. Borders: zelBorderConstant (borderValue),
+// replicate, wrap and the mirror kinds; in-memory sides are not read.
+class DerivativeRows32f {
+ public:
+  static size_t scratchBytes(DerivativeKernel kernel, int width);
+
+  DerivativeRows32f(const Zel32f* src, int srcStep, ZeliSize roi, DerivativeKernel kernel,
+                    ZeliBorderType border, Zel32f borderValue, void* scratch);
+
+  void row(int y, Zel32f* dx, Zel32f* dy) const;
+
+ private:
+  const Zel32f* src_;
+  int srcStep_;
+  ZeliSize roi_;
+  DerivativeKernel kernel_;
+  ZeliBorderType border_;
+  Zel32f borderValue_;
+  Zel32f* smooth_;  // width + 2 * radius column values (smoothing taps)
+  Zel32f* diff_;    // width + 2 * radius column values (derivative taps)
+};
 
 }  // namespace zelcv
 

@@ -333,9 +333,10 @@ std::string parseRoles(const Entry& e, std::vector<Arg>& args) {
     } else if (head == "arr") {
       s.role = Role::Array;
       std::vector<double> n = parseNumbers(arg, ',');
-      if (n.empty()) return fail("arr=count[,value]");
+      if (n.empty()) return fail("arr=count[,value...]");
       s.count = int(n[0]);
-      s.values = {n.size() > 1 ? n[1] : 0.0};
+      // Element k takes the k-th value given, the last one when there are fewer.
+      s.values = n.size() > 1 ? std::vector<double>(n.begin() + 1, n.end()) : std::vector<double>{0.0};
     } else if (head == "res") {
       s.role = Role::Result;
     } else if (head == "buf" || head == "blk") {
@@ -497,9 +498,10 @@ Outcome run(const Entry& e, const std::vector<Arg>& args, const Variant& v, int 
         blocks[i] = std::make_unique<Memory>(size_t(s.count) * size_t(s.elemSize), Placement::Guarded, 0);
         uint8_t* p = blocks[i]->data();
         for (int k = 0; k < s.count; ++k) {
-          if (s.floating && s.elemSize == 4) { float f = float(s.values[0]); std::memcpy(p + k * 4, &f, 4); }
-          else if (s.floating) { double d = s.values[0]; std::memcpy(p + k * 8, &d, 8); }
-          else { long long x = (long long)s.values[0]; std::memcpy(p + k * s.elemSize, &x, size_t(s.elemSize)); }
+          const double value = s.values[std::min<std::size_t>(size_t(k), s.values.size() - 1)];
+          if (s.floating && s.elemSize == 4) { float f = float(value); std::memcpy(p + k * 4, &f, 4); }
+          else if (s.floating) { double d = value; std::memcpy(p + k * 8, &d, 8); }
+          else { long long x = (long long)value; std::memcpy(p + k * s.elemSize, &x, size_t(s.elemSize)); }
         }
         val.p = p;
         break;

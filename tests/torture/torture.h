@@ -39,12 +39,19 @@ struct ParamInfo {
 
 // Size of an arithmetic element; 0 for anything else (opaque states too).
 // Points and rectangles count as arrays of their 32-bit fields (arr=2 for
-// one ZeliPoint, arr=4 for one ZeliRect).
+// one ZeliPoint or ZeliPoint_32f, arr=4 for one ZeliRect).
 template <typename P>
 constexpr int elementSize() {
   if constexpr (std::is_arithmetic<P>::value) return int(sizeof(P));
-  else if constexpr (std::is_same<P, ZeliPoint>::value || std::is_same<P, ZeliRect>::value) return 4;
+  else if constexpr (std::is_same<P, ZeliPoint>::value || std::is_same<P, ZeliRect>::value ||
+                     std::is_same<P, ZeliPoint_32f>::value)
+    return 4;
   else return 0;
+}
+
+template <typename P>
+constexpr bool floatingElements() {
+  return std::is_floating_point<P>::value || std::is_same<P, ZeliPoint_32f>::value;
 }
 
 template <typename T>
@@ -53,9 +60,9 @@ ParamInfo paramInfo() {
     using P = std::remove_cv_t<std::remove_pointer_t<T>>;
     if constexpr (std::is_pointer<P>::value) {
       using Q = std::remove_cv_t<std::remove_pointer_t<P>>;
-      return {'p', 2, elementSize<Q>(), std::is_floating_point<Q>::value};
+      return {'p', 2, elementSize<Q>(), floatingElements<Q>()};
     } else {
-      return {'p', 1, elementSize<P>(), std::is_floating_point<P>::value};
+      return {'p', 1, elementSize<P>(), floatingElements<P>()};
     }
   } else if constexpr (std::is_same<T, ZeliSize>::value) {
     return {'S', 0, 0, false};
