@@ -10,6 +10,7 @@
 #define ZELCV_MOTION_OPTFLOW_SUMS_H
 
 #include <emmintrin.h>
+#include <stddef.h>
 #include <stdint.h>
 
 #include "zelcv.h"
