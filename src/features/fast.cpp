@@ -12,6 +12,7 @@
 
 #include "core/alloc.h"
 #include "core/status.h"
+#include "kernels/simd.h"
 #include "features/fast_kernels.h"
 
 namespace zelcv {
@@ -178,7 +179,7 @@ ZELCV_ENTRY(zeliFastN2DToVec_8u)(const Zel8u* srcCorner, int srcCornerStep, cons
         *count = written;
         return zelStatusOutputFull;
       }
-      points[written] = ZeliPoint{x, y};
+      simd::storeOne(points + written, ZeliPoint{x, y});  // callers may pass any address
       scores[written] = s[x];
       ++written;
     }

@@ -10,6 +10,7 @@
 
 #include "core/alloc.h"
 #include "core/status.h"
+#include "kernels/simd.h"
 #include "features/hough_kernels.h"
 
 namespace zelcv {
@@ -98,8 +99,9 @@ ZelStatus houghLines(const Zel8u* src, int srcStep, ZeliSize roi, ZeliPoint_32f 
   std::partial_sort(cells, cells + kept, cells + found, stronger);
   for (size_t i = 0; i < kept; ++i) {
     const int n = cells[i].index / rhos, r = cells[i].index % rhos;
-    lines[i].x = (float(r) - float(rhos - 1) * 0.5f) * delta.x;
-    lines[i].y = thetaMin + float(n) * delta.y;
+    // Callers may pass the line array at any address.
+    const ZeliPoint_32f line{(float(r) - float(rhos - 1) * 0.5f) * delta.x, thetaMin + float(n) * delta.y};
+    simd::storeOne(lines + i, line);
   }
   *count = int(kept);
   return found > kept ? zelStatusOutputFull : zelStatusOk;

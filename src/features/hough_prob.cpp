@@ -11,6 +11,7 @@
 
 #include "core/alloc.h"
 #include "core/status.h"
+#include "kernels/simd.h"
 #include "features/hough_kernels.h"
 
 namespace zelcv {
@@ -220,8 +221,8 @@ ZELCV_ENTRY(zeliHoughProbLine_8u32f_C1R)(const Zel8u* src, int srcStep, ZeliSize
         if (x == end[k].x && y == end[k].y) break;
       }
     }
-    segments[2 * written] = end[0];
-    segments[2 * written + 1] = end[1];
+    simd::storeOne(segments + 2 * written, end[0]);  // callers may pass any address
+    simd::storeOne(segments + 2 * written + 1, end[1]);
     ++written;
   }
   *count = written;

@@ -8,6 +8,7 @@
 
 #include "core/alloc.h"
 #include "core/status.h"
+#include "kernels/simd.h"
 
 namespace zelcv {
 namespace {
@@ -83,7 +84,7 @@ ZelStatus findPeaks(const T* src, int srcStep, ZeliSize roi, T threshold, int no
         status = zelStatusOutputFull;
         break;
       }
-      peaks[written++] = ZeliPoint{x, int(y)};
+      simd::storeOne(peaks + written++, ZeliPoint{x, int(y)});  // any address
     }
   }
   *count = written;
