@@ -107,7 +107,8 @@ void printTable(const std::map<std::string, Result>& results) {
 
   std::printf("\n%-52s %12s %12s %7s %9s %6s\n", "case", "zelcv us", "opencv us", "ratio",
               "zelcv GB/s", "%copy");
-  int slower = 0;
+  int slower = 0, pairs = 0;
+  double logSum = 0;
   for (const auto& [name, r] : results) {
     const std::string suffix = "/zelcv";
     if (name.size() <= suffix.size() || name.compare(name.size() - suffix.size(), suffix.size(), suffix) != 0)
@@ -117,6 +118,8 @@ void printTable(const std::map<std::string, Result>& results) {
     if (other == results.end()) continue;
     double ratio = r.microseconds / other->second.microseconds;
     if (ratio > 1.0) ++slower;
+    ++pairs;
+    logSum += std::log(ratio);
     std::printf("%-52s %12.1f %12.1f %7.2f", base.c_str(), r.microseconds, other->second.microseconds, ratio);
     if (r.bytesPerSecond > 0) {
       std::printf(" %9.2f", r.bytesPerSecond / 1e9);
@@ -126,6 +129,8 @@ void printTable(const std::map<std::string, Result>& results) {
     std::printf("\n");
   }
   std::printf("\nratio = zelcv time / OpenCV time (below 1.0: zelcv faster); %d case(s) slower\n", slower);
+  // The geometric mean weighs a halving and a doubling alike, whatever a row's absolute time.
+  if (pairs > 0) std::printf("geometric mean of %d ratios: %.3f\n", pairs, std::exp(logSum / pairs));
 }
 
 }  // namespace

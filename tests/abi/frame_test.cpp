@@ -80,7 +80,7 @@ TEST(Release, SingleBlockFreeNames) {
     std::string impl = e.implementation;
     if (impl != "releaseSingleBlock" && impl != "releasePyramidLayer") continue;
     SCOPED_TRACE(e.name);
-    auto release = reinterpret_cast<FreeFn>(zeltest::exportedAddress(e.name));
+    auto release = reinterpret_cast<FreeFn>(const_cast<void*>(zeltest::exportedAddress(e.name)));
     ASSERT_NE(release, nullptr);
     zeltest::FaultInjection faults;
     EXPECT_EQ(release(nullptr), zelStatusNullPointer);

@@ -101,19 +101,16 @@ template <>
 struct Api<Zel8u> {
   static constexpr auto init = zeliOpticalFlowPyrLKInitAlloc_8u_C1R;
   static constexpr auto track = zeliOpticalFlowPyrLK_8u_C1R;
-  static constexpr auto release = zeliOpticalFlowPyrLKFree_8u_C1R;
 };
 template <>
 struct Api<Zel16u> {
   static constexpr auto init = zeliOpticalFlowPyrLKInitAlloc_16u_C1R;
   static constexpr auto track = zeliOpticalFlowPyrLK_16u_C1R;
-  static constexpr auto release = zeliOpticalFlowPyrLKFree_16u_C1R;
 };
 template <>
 struct Api<Zel32f> {
   static constexpr auto init = zeliOpticalFlowPyrLKInitAlloc_32f_C1R;
   static constexpr auto track = zeliOpticalFlowPyrLK_32f_C1R;
-  static constexpr auto release = zeliOpticalFlowPyrLKFree_32f_C1R;
 };
 
 struct StateDeleter {

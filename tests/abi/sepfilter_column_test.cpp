@@ -143,7 +143,7 @@ TYPED_TEST(ColumnPipeline, ChecksInTheirOrder) {
   using M = TypeParam;
   using Call = ColumnCall<M>;
   constexpr int elementSize = int(sizeof(typename M::D));
-  const int rowBytes = Call::width * Call::ch * elementSize;
+  constexpr int rowBytes = Call::width * Call::ch * elementSize;
   auto expect = [](ZelStatus want, auto&& change, const char* what) { expectStatus<Call>(want, change, what); };
   expect(zelStatusNullPointer, [](Call& c) { c.src = nullptr; c.roi.height = 0; }, "null src before size");
   expect(zelStatusNullPointer, [](Call& c) { c.dst = nullptr; }, "null dst");
@@ -156,11 +156,11 @@ TYPED_TEST(ColumnPipeline, ChecksInTheirOrder) {
   expect(zelStatusNullPointer, [](Call& c) { c.size = 0; c.rows[0] = nullptr; }, "row before size 0");
   expect(zelStatusBadSize, [](Call& c) { c.size = 0; c.rows[1] = nullptr; }, "size 0");
   expect(zelStatusBadSize, [](Call& c) { c.size = -4; c.dstStep = 0; }, "negative size before step");
-  expect(zelStatusBadStep, [rowBytes](Call& c) { c.dstStep = rowBytes - 1; c.buf = nullptr; }, "step before buffer");
-  expect(elementSize == 1 ? zelStatusOk : zelStatusMisalignedStep, [rowBytes](Call& c) { c.dstStep = rowBytes + 1; },
+  expect(zelStatusBadStep, [](Call& c) { c.dstStep = rowBytes - 1; c.buf = nullptr; }, "step before buffer");
+  expect(elementSize == 1 ? zelStatusOk : zelStatusMisalignedStep, [](Call& c) { c.dstStep = rowBytes + 1; },
          "odd step");
   if (elementSize == 4)
-    expect(zelStatusMisalignedStep, [rowBytes](Call& c) { c.dstStep = rowBytes + 2; c.buf = nullptr; },
+    expect(zelStatusMisalignedStep, [](Call& c) { c.dstStep = rowBytes + 2; c.buf = nullptr; },
            "32f step not a multiple of 4, before buffer");
   expect(zelStatusNullPointer, [](Call& c) { c.buf = nullptr; c.divisor = 0; }, "null buffer before divisor");
   expect(M::rule == DivisorRule::none ? zelStatusOk : zelStatusBadArgument, [](Call& c) { c.divisor = 0; },

@@ -7,6 +7,7 @@
 #endif
 
 #include <algorithm>
+#include <climits>
 #include <cstdlib>
 #include <cstring>
 #include <memory>
@@ -422,6 +423,16 @@ const std::vector<Described>& described() {
 
 namespace {
 
+// A table value as an integer argument. Values meant for float parameters
+// (1e30, NaN) have no integer form: they saturate, and NaN gives 0, rather
+// than make the conversion itself undefined.
+long long integerOf(double v) {
+  if (!(v == v)) return 0;
+  if (v >= 9.2e18) return LLONG_MAX;
+  if (v <= -9.2e18) return LLONG_MIN;
+  return static_cast<long long>(v);
+}
+
 struct ImageMemory {
   std::unique_ptr<Memory> memory;
   int step = 0;
@@ -492,8 +503,8 @@ Outcome run(const Entry& e, const std::vector<Arg>& args, const Variant& v, int 
       case Role::Size: val.size = s.size; break;
       case Role::Point: val.point = s.point; break;
       case Role::Rect: val.rect = s.rect; break;
-      case Role::Scalar: val.i = (long long)s.values[0]; val.f = s.values[0]; break;
-      case Role::Border: val.i = (long long)s.values[std::min<std::size_t>(size_t(v.border), s.values.size() - 1)]; break;
+      case Role::Scalar: val.i = integerOf(s.values[0]); val.f = s.values[0]; break;
+      case Role::Border: val.i = integerOf(s.values[std::min<std::size_t>(size_t(v.border), s.values.size() - 1)]); break;
       case Role::Array: {
         blocks[i] = std::make_unique<Memory>(size_t(s.count) * size_t(s.elemSize), Placement::Guarded, 0);
         uint8_t* p = blocks[i]->data();
@@ -501,7 +512,7 @@ Outcome run(const Entry& e, const std::vector<Arg>& args, const Variant& v, int 
           const double value = s.values[std::min<std::size_t>(size_t(k), s.values.size() - 1)];
           if (s.floating && s.elemSize == 4) { float f = float(value); std::memcpy(p + k * 4, &f, 4); }
           else if (s.floating) { double d = value; std::memcpy(p + k * 8, &d, 8); }
-          else { long long x = (long long)value; std::memcpy(p + k * s.elemSize, &x, size_t(s.elemSize)); }
+          else { long long x = integerOf(value); std::memcpy(p + k * s.elemSize, &x, size_t(s.elemSize)); }
         }
         val.p = p;
         break;
