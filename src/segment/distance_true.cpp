@@ -103,9 +103,23 @@ void envelopeRowExact(float* g, int w, int32_t* site, int64_t* f) {
   // in one pass; from the first larger one on, the row takes double roots.
   bool small = true;
   int j = 0;
+  // The current parabola and its successor's breakpoint, kept in registers.
+  int64_t fj = f[0], twoSite = 2 * int64_t(site[0]), nextN = 0, nextD = 0;
+  auto follow = [&]() {
+    if (j < k) {
+      nextN = f[j + 1] - f[j];
+      nextD = 2 * int64_t(site[j + 1] - site[j]);
+    }
+  };
+  follow();
   for (int x = 0; x < w; ++x) {
-    while (j < k && int64_t(x) * 2 * (site[j + 1] - site[j]) >= f[j + 1] - f[j]) ++j;
-    const int64_t d2 = f[j] + int64_t(x) * (int64_t(x) - 2 * int64_t(site[j]));
+    while (j < k && int64_t(x) * nextD >= nextN) {
+      ++j;
+      fj = f[j];
+      twoSite = 2 * int64_t(site[j]);
+      follow();
+    }
+    const int64_t d2 = fj + int64_t(x) * (int64_t(x) - twoSite);
     if (small && d2 >= 16777216) {
       small = false;
       rootsOfSmallSquares(g, x);
