@@ -162,7 +162,7 @@ bool integerTaps(const float* taps, int K, int16_t* itaps) {
   double bound = 0.0;
   for (int k = 0; k < K; ++k) {
     const double t = double(taps[k]) * 8192.0;
-    if (t != double(int32_t(t)) || t < -32768.0 || t > 32767.0) return false;
+    if (t < -32768.0 || t > 32767.0 || t != double(int32_t(t))) return false;
     itaps[k] = int16_t(t);
     bound += (t < 0 ? -t : t) * 255.0;
   }
