@@ -69,7 +69,7 @@ inline __m128 scaledLoad4(const Zel16s* p) {
 // those of the copy from a scaled float plane. Rows and columns clamp to
 // the plane as the copy's do.
 void copyScaledWindow(const Zel16s* plane, ZeliSize size, float* dst, int dstStride, int n,
-                      const subpix::Placement& p) {
+                      const subpix::Placement& p, bool wide) {
   const int64_t W = size.width, H = size.height;
   auto clamp = [](int64_t v, int64_t lo, int64_t hi) { return v < lo ? lo : v > hi ? hi : v; };
   const int lo = int(clamp(-p.ix, 0, n)), hi = int(clamp(W - 1 - p.ix, lo, n));
@@ -93,6 +93,10 @@ void copyScaledWindow(const Zel16s* plane, ZeliSize size, float* dst, int dstStr
       v = _mm_add_ps(v, _mm_mul_ps(scaledLoad4(a1), w10));
       _mm_storeu_ps(d + at, _mm_add_ps(v, _mm_mul_ps(scaledLoad4(a1 + 1), w11)));
     };
+    if (wide && hi - lo >= 8) {
+      avx2::optflowScaledInterior(s0 + (p.ix + lo), s1 + (p.ix + lo), d + lo, hi - lo, p);
+      i = hi;
+    }
     for (; i + 4 <= hi; i += 4) four(i);
     // A ragged end: the last four again, rewriting the same values.
     if (i < hi && hi - lo >= 4) {
@@ -201,8 +205,8 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
       if (wholeLevel) {
         subpix::copyWindow(first.data, first.step, first.size, w.i, bytes, win, pp);
         if constexpr (std::is_same<T, Zel8u>::value) {
-          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gx), first.size, w.ix, w.stride, n, pp);
-          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gy), first.size, w.iy, w.stride, n, pp);
+          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gx), first.size, w.ix, w.stride, n, pp, prm.wide);
+          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gy), first.size, w.iy, w.stride, n, pp, prm.wide);
         } else {
           const int gstep = first.size.width * int(sizeof(float));
           subpix::copyWindow<float, float>(w.gx, gstep, first.size, w.ix, bytes, win, pp);

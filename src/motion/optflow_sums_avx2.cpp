@@ -62,5 +62,22 @@ optflow::MismatchSums optflowMismatchSums(const optflow::WindowSet& w, ZeliRect 
   return {optflowTotal(bx), optflowTotal(by), optflowTotal(e)};
 }
 
+void optflowScaledInterior(const Zel16s* a0, const Zel16s* a1, float* d, int count, const subpix::Placement& p) {
+  const __m256 w00 = _mm256_set1_ps(p.w00), w01 = _mm256_set1_ps(p.w01), w10 = _mm256_set1_ps(p.w10),
+               w11 = _mm256_set1_ps(p.w11), scale = _mm256_set1_ps(1.0f / 32);
+  auto load = [&](const Zel16s* q) {
+    return _mm256_mul_ps(
+        _mm256_cvtepi32_ps(_mm256_cvtepi16_epi32(_mm_loadu_si128(reinterpret_cast<const __m128i*>(q)))), scale);
+  };
+  auto eight = [&](int at) {
+    __m256 v = _mm256_add_ps(_mm256_mul_ps(load(a0 + at), w00), _mm256_mul_ps(load(a0 + at + 1), w01));
+    v = _mm256_add_ps(v, _mm256_mul_ps(load(a1 + at), w10));
+    _mm256_storeu_ps(d + at, _mm256_add_ps(v, _mm256_mul_ps(load(a1 + at + 1), w11)));
+  };
+  int i = 0;
+  for (; i + 8 <= count; i += 8) eight(i);
+  if (i < count) eight(count - 8);
+}
+
 }  // namespace avx2
 }  // namespace zelcv
