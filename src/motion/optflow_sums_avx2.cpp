@@ -24,18 +24,20 @@ inline double optflowTotal(__m256d v) {
 optflow::GradientSums optflowGradientSums(const optflow::WindowSet& w, ZeliRect r) {
   __m256d xx = _mm256_setzero_pd(), xy = _mm256_setzero_pd(), yy = _mm256_setzero_pd();
   const __m256d tail = optflowTailMask(((r.width - 1) & 3) + 1);
-  const __m256d all = _mm256_castsi256_pd(_mm256_set1_epi64x(-1));
   const int full = (r.width - 1) & ~3;
   for (int y = r.y; y < r.y + r.height; ++y) {
     const double* gx = w.ix + ptrdiff_t(y) * w.stride + r.x;
     const double* gy = w.iy + ptrdiff_t(y) * w.stride + r.x;
-    for (int c = 0; c <= full; c += 4) {
-      const __m256d m = c < full ? all : tail;
+    for (int c = 0; c < full; c += 4) {
       const __m256d x = _mm256_loadu_pd(gx + c), v = _mm256_loadu_pd(gy + c);
-      xx = _mm256_add_pd(xx, _mm256_and_pd(_mm256_mul_pd(x, x), m));
-      xy = _mm256_add_pd(xy, _mm256_and_pd(_mm256_mul_pd(x, v), m));
-      yy = _mm256_add_pd(yy, _mm256_and_pd(_mm256_mul_pd(v, v), m));
+      xx = _mm256_add_pd(xx, _mm256_mul_pd(x, x));
+      xy = _mm256_add_pd(xy, _mm256_mul_pd(x, v));
+      yy = _mm256_add_pd(yy, _mm256_mul_pd(v, v));
     }
+    const __m256d x = _mm256_loadu_pd(gx + full), v = _mm256_loadu_pd(gy + full);
+    xx = _mm256_add_pd(xx, _mm256_and_pd(_mm256_mul_pd(x, x), tail));
+    xy = _mm256_add_pd(xy, _mm256_and_pd(_mm256_mul_pd(x, v), tail));
+    yy = _mm256_add_pd(yy, _mm256_and_pd(_mm256_mul_pd(v, v), tail));
   }
   return {optflowTotal(xx), optflowTotal(xy), optflowTotal(yy)};
 }
@@ -43,7 +45,6 @@ optflow::GradientSums optflowGradientSums(const optflow::WindowSet& w, ZeliRect 
 optflow::MismatchSums optflowMismatchSums(const optflow::WindowSet& w, ZeliRect r) {
   __m256d bx = _mm256_setzero_pd(), by = _mm256_setzero_pd(), e = _mm256_setzero_pd();
   const __m256d tail = optflowTailMask(((r.width - 1) & 3) + 1);
-  const __m256d all = _mm256_castsi256_pd(_mm256_set1_epi64x(-1));
   const int full = (r.width - 1) & ~3;
   for (int y = r.y; y < r.y + r.height; ++y) {
     const ptrdiff_t at = ptrdiff_t(y) * w.stride + r.x;
@@ -51,13 +52,16 @@ optflow::MismatchSums optflowMismatchSums(const optflow::WindowSet& w, ZeliRect 
     const float* b = w.j + at;
     const double* gx = w.ix + at;
     const double* gy = w.iy + at;
-    for (int c = 0; c <= full; c += 4) {
-      const __m256d m = c < full ? all : tail;
+    for (int c = 0; c < full; c += 4) {
       const __m256d d = _mm256_cvtps_pd(_mm_sub_ps(_mm_loadu_ps(a + c), _mm_loadu_ps(b + c)));
-      bx = _mm256_add_pd(bx, _mm256_and_pd(_mm256_mul_pd(d, _mm256_loadu_pd(gx + c)), m));
-      by = _mm256_add_pd(by, _mm256_and_pd(_mm256_mul_pd(d, _mm256_loadu_pd(gy + c)), m));
-      e = _mm256_add_pd(e, _mm256_and_pd(_mm256_mul_pd(d, d), m));
+      bx = _mm256_add_pd(bx, _mm256_mul_pd(d, _mm256_loadu_pd(gx + c)));
+      by = _mm256_add_pd(by, _mm256_mul_pd(d, _mm256_loadu_pd(gy + c)));
+      e = _mm256_add_pd(e, _mm256_mul_pd(d, d));
     }
+    const __m256d d = _mm256_cvtps_pd(_mm_sub_ps(_mm_loadu_ps(a + full), _mm_loadu_ps(b + full)));
+    bx = _mm256_add_pd(bx, _mm256_and_pd(_mm256_mul_pd(d, _mm256_loadu_pd(gx + full)), tail));
+    by = _mm256_add_pd(by, _mm256_and_pd(_mm256_mul_pd(d, _mm256_loadu_pd(gy + full)), tail));
+    e = _mm256_add_pd(e, _mm256_and_pd(_mm256_mul_pd(d, d), tail));
   }
   return {optflowTotal(bx), optflowTotal(by), optflowTotal(e)};
 }
