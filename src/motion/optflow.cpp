@@ -177,6 +177,18 @@ inline bool sameRect(ZeliRect a, ZeliRect b) {
   return a.x == b.x && a.y == b.y && a.width == b.width && a.height == b.height;
 }
 
+// The sub-pixel copy of an image window; with AVX2 a window whose taps all
+// lie inside the image (no row or column clamped) goes in one piece.
+template <typename T>
+void copyImageWindow(const LevelImage<T>& im, float* dst, int stride, int n, const subpix::Placement& p, bool wide) {
+  if (wide && n >= 8 && p.ix >= 0 && p.iy >= 0 && p.ix + n < int64_t(im.size.width) &&
+      p.iy + n < int64_t(im.size.height)) {
+    avx2::optflowInteriorWindow(im.data, im.step, dst, stride, n, p);
+    return;
+  }
+  subpix::copyWindow(im.data, im.step, im.size, dst, stride * int(sizeof(float)), {n, n}, p);
+}
+
 struct Params {
   int winSize, maxIter;
   double threshold2;
@@ -203,7 +215,7 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
     if (ri.width > 0) {
       const int bytes = w.stride * int(sizeof(float));
       if (wholeLevel) {
-        subpix::copyWindow(first.data, first.step, first.size, w.i, bytes, win, pp);
+        copyImageWindow(first, w.i, w.stride, n, pp, prm.wide);
         if constexpr (std::is_same<T, Zel8u>::value) {
           copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gx), first.size, w.ix, w.stride, n, pp, prm.wide);
           copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gy), first.size, w.iy, w.stride, n, pp, prm.wide);
@@ -235,7 +247,7 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
     if (!subpix::place(g, win, &pj)) return false;
     const ZeliRect rj = subpix::insideRect(pj, second.size, win);
     if (rj.width == 0) return false;
-    subpix::copyWindow(second.data, second.step, second.size, w.j, w.stride * int(sizeof(float)), win, pj);
+    copyImageWindow(second, w.j, w.stride, n, pj, prm.wide);
     const ZeliRect r = intersect(ri, rj);
     if (r.width == 0) {
       *next = g;

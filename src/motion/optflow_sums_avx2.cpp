@@ -66,6 +66,50 @@ optflow::MismatchSums optflowMismatchSums(const optflow::WindowSet& w, ZeliRect 
   return {optflowTotal(bx), optflowTotal(by), optflowTotal(e)};
 }
 
+namespace {
+
+inline __m256 windowLoad8(const float* p) { return _mm256_loadu_ps(p); }
+inline __m256 windowLoad8(const uint8_t* p) {
+  return _mm256_cvtepi32_ps(_mm256_cvtepu8_epi32(_mm_loadl_epi64(reinterpret_cast<const __m128i*>(p))));
+}
+inline __m256 windowLoad8(const uint16_t* p) {
+  return _mm256_cvtepi32_ps(_mm256_cvtepu16_epi32(_mm_loadu_si128(reinterpret_cast<const __m128i*>(p))));
+}
+
+template <typename S>
+void interiorWindow(const S* src, int step, float* dst, int dstStride, int n, const subpix::Placement& p) {
+  const __m256 w00 = _mm256_set1_ps(p.w00), w01 = _mm256_set1_ps(p.w01), w10 = _mm256_set1_ps(p.w10),
+               w11 = _mm256_set1_ps(p.w11);
+  const char* base = reinterpret_cast<const char*>(src + p.ix) + ptrdiff_t(step) * ptrdiff_t(p.iy);
+  for (int j = 0; j < n; ++j) {
+    const S* a0 = reinterpret_cast<const S*>(base + ptrdiff_t(step) * j);
+    const S* a1 = reinterpret_cast<const S*>(base + ptrdiff_t(step) * (j + 1));
+    float* d = dst + ptrdiff_t(j) * dstStride;
+    auto eight = [&](int at) {
+      __m256 v = _mm256_add_ps(_mm256_mul_ps(windowLoad8(a0 + at), w00), _mm256_mul_ps(windowLoad8(a0 + at + 1), w01));
+      v = _mm256_add_ps(v, _mm256_mul_ps(windowLoad8(a1 + at), w10));
+      _mm256_storeu_ps(d + at, _mm256_add_ps(v, _mm256_mul_ps(windowLoad8(a1 + at + 1), w11)));
+    };
+    int i = 0;
+    for (; i + 8 <= n; i += 8) eight(i);
+    if (i < n) eight(n - 8);
+  }
+}
+
+}  // namespace
+
+void optflowInteriorWindow(const Zel8u* src, int step, float* dst, int dstStride, int n, const subpix::Placement& p) {
+  interiorWindow(src, step, dst, dstStride, n, p);
+}
+void optflowInteriorWindow(const Zel16u* src, int step, float* dst, int dstStride, int n,
+                           const subpix::Placement& p) {
+  interiorWindow(src, step, dst, dstStride, n, p);
+}
+void optflowInteriorWindow(const Zel32f* src, int step, float* dst, int dstStride, int n,
+                           const subpix::Placement& p) {
+  interiorWindow(src, step, dst, dstStride, n, p);
+}
+
 void optflowScaledInterior(const Zel16s* a0, const Zel16s* a1, float* d, int count, const subpix::Placement& p) {
   const __m256 w00 = _mm256_set1_ps(p.w00), w01 = _mm256_set1_ps(p.w01), w10 = _mm256_set1_ps(p.w10),
                w11 = _mm256_set1_ps(p.w11), scale = _mm256_set1_ps(1.0f / 32);
