@@ -111,11 +111,13 @@ inline uint32_t cornerBits(const Circle& c, const Zel8u* centre, int threshold, 
   // Non-zero where the pixel is brighter (darker) than the limit.
   auto above = [&](int k) { return V::subs(V::load(centre + c.offset[k]), hiLimit); };
   auto below = [&](int k) { return V::subs(loLimit, V::load(centre + c.offset[k])); };
-  // Compass pixels: an arc longer than half the circle covers two
-  // neighbouring ones.
+  // An arc longer than half the circle covers one of two opposite pixels,
   const int q = c.n / 4;
-  const R b0 = above(0), b1 = above(q), b2 = above(2 * q), b3 = above(3 * q);
-  const R d0 = below(0), d1 = below(q), d2 = below(2 * q), d3 = below(3 * q);
+  const R b0 = above(0), b2 = above(2 * q), d0 = below(0), d2 = below(2 * q);
+  if (!V::nonZeroBits(V::max(V::max(b0, b2), V::max(d0, d2)))) return 0;
+  // and two neighbouring compass pixels.
+  const R b1 = above(q), b3 = above(3 * q);
+  const R d1 = below(q), d3 = below(3 * q);
   const R maybeB = V::max(V::max(V::min(b0, b1), V::min(b1, b2)), V::max(V::min(b2, b3), V::min(b3, b0)));
   const R maybeD = V::max(V::max(V::min(d0, d1), V::min(d1, d2)), V::max(V::min(d2, d3), V::min(d3, d0)));
   const uint32_t maybe = V::nonZeroBits(V::max(maybeB, maybeD));
