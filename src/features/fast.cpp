@@ -86,16 +86,15 @@ ZELCV_ENTRY(zeliFastN_8u_C1R)(const Zel8u* src, int srcStep, Zel8u* dstCorner, i
   // column on each side.
   auto ringRow = [&](int y) { return ring + size_t((y + 3) % 3) * stride + 1; };
   const bool wide = useAvx2Kernels();
-  int found[3] = {0, 0, 0};  // corners in each ring slot
+  // Corners in each ring slot; -1 while the slot may hold anything. A slot
+  // is cleared only when it holds corners.
+  int found[3] = {-1, -1, -1};
   auto rawRow = [&](int y) {
     Zel8u* out = ringRow(y);
     int& n = found[(y + 3) % 3];
-    if (y < r || y >= h - r) {
-      std::memset(out - 1, 0, stride);
-      n = 0;
-      return;
-    }
-    out[-1] = out[w] = 0;
+    if (n) std::memset(out - 1, 0, stride);
+    n = 0;
+    if (y < r || y >= h - r) return;
     const Zel8u* row = src + ptrdiff_t(y) * srcStep;
     n = wide ? avx2::fastScoreRow(circle, row, w, st->threshold, st->arc, out)
              : fast::scoreRow<>(circle, row, w, st->threshold, st->arc, out);

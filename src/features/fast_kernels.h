@@ -6,8 +6,6 @@
 #include <stddef.h>
 #include <stdint.h>
 
-#include <cstring>
-
 #include "zelcv.h"
 
 namespace zelcv {
@@ -161,12 +159,11 @@ inline int scoreSpan(const Circle& c, const Zel8u* row, int begin, int* x, int e
   return found;
 }
 
-// One row of raw scores: score + 1 for corners, 0 elsewhere. Returns the
-// number of corners.
+// One row of raw scores into `out`, which holds zeros: score + 1 at corners.
+// Returns the number of corners.
 template <class... Wide>
 inline int scoreRow(const Circle& c, const Zel8u* row, int width, int threshold, int arc, Zel8u* out) {
   const int r = c.radius;
-  std::memset(out, 0, size_t(width));
   int x = r, found = 0;
   ((found += scoreSpan<Wide>(c, row, r, &x, width - r, threshold, arc, out)), ...);
   found += scoreSpan<Lanes16>(c, row, r, &x, width - r, threshold, arc, out);
