@@ -67,8 +67,9 @@ inline __m128 scaledLoad4(const Zel16s* p) {
 // every tap is scaled by 1/32 (exactly: a power of two) before the copy's
 // blend, ((t00 w00 + t01 w01) + t10 w10) + t11 w11, so the values equal
 // those of the copy from a scaled float plane. Rows and columns clamp to
-// the plane as the copy's do.
-void copyScaledWindow(const Zel16s* plane, ZeliSize size, float* dst, int dstStride, int n,
+// the plane as the copy's do. The values go out converted to double, as
+// the sums want them.
+void copyScaledWindow(const Zel16s* plane, ZeliSize size, double* dst, int dstStride, int n,
                       const subpix::Placement& p, bool wide) {
   const int64_t W = size.width, H = size.height;
   auto clamp = [](int64_t v, int64_t lo, int64_t hi) { return v < lo ? lo : v > hi ? hi : v; };
@@ -78,11 +79,13 @@ void copyScaledWindow(const Zel16s* plane, ZeliSize size, float* dst, int dstStr
   for (int j = 0; j < n; ++j) {
     const Zel16s* s0 = plane + clamp(p.iy + j, 0, H - 1) * W;
     const Zel16s* s1 = plane + clamp(p.iy + j + 1, 0, H - 1) * W;
-    float* d = dst + ptrdiff_t(j) * dstStride;
+    double* d = dst + ptrdiff_t(j) * dstStride;
     auto one = [&](int i) {
       const int64_t c0 = clamp(p.ix + i, 0, W - 1), c1 = clamp(p.ix + i + 1, 0, W - 1);
-      d[i] = ((float(s0[c0]) * kScale * p.w00 + float(s0[c1]) * kScale * p.w01) + float(s1[c0]) * kScale * p.w10) +
-             float(s1[c1]) * kScale * p.w11;
+      const float v = ((float(s0[c0]) * kScale * p.w00 + float(s0[c1]) * kScale * p.w01) +
+                       float(s1[c0]) * kScale * p.w10) +
+                      float(s1[c1]) * kScale * p.w11;
+      d[i] = double(v);
     };
     int i = 0;
     for (; i < lo; ++i) one(i);
@@ -91,7 +94,9 @@ void copyScaledWindow(const Zel16s* plane, ZeliSize size, float* dst, int dstStr
       const Zel16s* a1 = s1 + (p.ix + at);
       __m128 v = _mm_add_ps(_mm_mul_ps(scaledLoad4(a0), w00), _mm_mul_ps(scaledLoad4(a0 + 1), w01));
       v = _mm_add_ps(v, _mm_mul_ps(scaledLoad4(a1), w10));
-      _mm_storeu_ps(d + at, _mm_add_ps(v, _mm_mul_ps(scaledLoad4(a1 + 1), w11)));
+      v = _mm_add_ps(v, _mm_mul_ps(scaledLoad4(a1 + 1), w11));
+      _mm_storeu_pd(d + at, _mm_cvtps_pd(v));
+      _mm_storeu_pd(d + at + 2, _mm_cvtps_pd(_mm_movehl_ps(v, v)));
     };
     if (wide && hi - lo >= 8) {
       avx2::optflowScaledInterior(s0 + (p.ix + lo), s1 + (p.ix + lo), d + lo, hi - lo, p);
@@ -217,12 +222,14 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
       if (wholeLevel) {
         copyImageWindow(first, w.i, w.stride, n, pp, prm.wide);
         if constexpr (std::is_same<T, Zel8u>::value) {
-          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gx), first.size, w.ix, w.stride, n, pp, prm.wide);
-          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gy), first.size, w.iy, w.stride, n, pp, prm.wide);
+          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gx), first.size, w.ixd, w.stride, n, pp, prm.wide);
+          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gy), first.size, w.iyd, w.stride, n, pp, prm.wide);
         } else {
           const int gstep = first.size.width * int(sizeof(float));
           subpix::copyWindow<float, float>(w.gx, gstep, first.size, w.ix, bytes, win, pp);
           subpix::copyWindow<float, float>(w.gy, gstep, first.size, w.iy, bytes, win, pp);
+          toDouble(w.ix, w.ixd, w.stride, n);
+          toDouble(w.iy, w.iyd, w.stride, n);
         }
       } else {
         subpix::Placement pm = pp;
@@ -230,9 +237,9 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
         pm.iy -= 1;
         subpix::copyWindow(first.data, first.step, first.size, w.margin, bytes, {n + 2, n + 2}, pm);
         windowGradients(w, n);
+        toDouble(w.ix, w.ixd, w.stride, n);
+        toDouble(w.iy, w.iyd, w.stride, n);
       }
-      toDouble(w.ix, w.ixd, w.stride, n);
-      toDouble(w.iy, w.iyd, w.stride, n);
     }
   }
 

@@ -110,7 +110,7 @@ void optflowInteriorWindow(const Zel32f* src, int step, float* dst, int dstStrid
   interiorWindow(src, step, dst, dstStride, n, p);
 }
 
-void optflowScaledInterior(const Zel16s* a0, const Zel16s* a1, float* d, int count, const subpix::Placement& p) {
+void optflowScaledInterior(const Zel16s* a0, const Zel16s* a1, double* d, int count, const subpix::Placement& p) {
   const __m256 w00 = _mm256_set1_ps(p.w00), w01 = _mm256_set1_ps(p.w01), w10 = _mm256_set1_ps(p.w10),
                w11 = _mm256_set1_ps(p.w11), scale = _mm256_set1_ps(1.0f / 32);
   auto load = [&](const Zel16s* q) {
@@ -120,7 +120,9 @@ void optflowScaledInterior(const Zel16s* a0, const Zel16s* a1, float* d, int cou
   auto eight = [&](int at) {
     __m256 v = _mm256_add_ps(_mm256_mul_ps(load(a0 + at), w00), _mm256_mul_ps(load(a0 + at + 1), w01));
     v = _mm256_add_ps(v, _mm256_mul_ps(load(a1 + at), w10));
-    _mm256_storeu_ps(d + at, _mm256_add_ps(v, _mm256_mul_ps(load(a1 + at + 1), w11)));
+    v = _mm256_add_ps(v, _mm256_mul_ps(load(a1 + at + 1), w11));
+    _mm256_storeu_pd(d + at, _mm256_cvtps_pd(_mm256_castps256_ps128(v)));
+    _mm256_storeu_pd(d + at + 4, _mm256_cvtps_pd(_mm256_extractf128_ps(v, 1)));
   };
   int i = 0;
   for (; i + 8 <= count; i += 8) eight(i);
