@@ -49,13 +49,20 @@ inline void loadPixels(const uint8_t* s, __m256* x) {
 }
 
 // Two groups of four pixels, g0 and g1: returns the foreground lanes as
-// all-ones. Mirrors the baseline's processGroup step for step.
+// all-ones. Mirrors the baseline's processGroup step for step, except that
+// a component unused (weight 0) in all eight lanes is not evaluated: it is
+// never close and never matched, its new weight is 0 (0 * b - c is not
+// above 0) and adds nothing to a rank sum, so only replacement can change
+// it.
 template <int K>
 inline __m256 processPair(float* g0, float* g1, const __m256* x, const Consts& f) {
   __m256 w[K], e[K][3], dist[K], v[K];
+  bool live[K];
   for (int k = 0; k < K; ++k) {
     const int o = k * kFields * 4;
     w[k] = load2(g0 + o, g1 + o);
+    live[k] = _mm256_movemask_ps(gt(w[k], f.zero)) != 0;
+    if (!live[k]) continue;
     for (int j = 0; j < 3; ++j) e[k][j] = _mm256_sub_ps(x[j], load2(g0 + o + 4 * (1 + j), g1 + o + 4 * (1 + j)));
     dist[k] = _mm256_add_ps(_mm256_add_ps(_mm256_mul_ps(e[k][0], e[k][0]), _mm256_mul_ps(e[k][1], e[k][1])),
                             _mm256_mul_ps(e[k][2], e[k][2]));
@@ -63,12 +70,13 @@ inline __m256 processPair(float* g0, float* g1, const __m256* x, const Consts& f
   }
   __m256 background = f.zero, bestW = _mm256_set1_ps(-1.0f), bestIdx = _mm256_set1_ps(-1.0f);
   for (int k = 0; k < K; ++k) {
+    if (!live[k]) continue;
     const __m256 used = gt(w[k], f.zero);
     const __m256 close = _mm256_and_ps(used, lt(dist[k], _mm256_mul_ps(f.tb, v[k])));
     if (_mm256_movemask_ps(close)) {
       __m256 ranked = f.zero;
       for (int j = 0; j < K; ++j) {
-        if (j == k) continue;
+        if (j == k || !live[j]) continue;
         const __m256 before = j < k ? ge(w[j], w[k]) : gt(w[j], w[k]);
         ranked = _mm256_add_ps(ranked, _mm256_and_ps(before, w[j]));
       }
@@ -80,6 +88,10 @@ inline __m256 processPair(float* g0, float* g1, const __m256* x, const Consts& f
   }
   __m256 nw[K], matched[K], matchedW = f.zero;
   for (int k = 0; k < K; ++k) {
+    if (!live[k]) {
+      nw[k] = matched[k] = f.zero;
+      continue;
+    }
     matched[k] = eq(bestIdx, _mm256_set1_ps(float(k)));
     const __m256 t = _mm256_add_ps(_mm256_sub_ps(_mm256_mul_ps(w[k], f.b), f.c), _mm256_and_ps(matched[k], f.a));
     nw[k] = _mm256_and_ps(gt(t, f.zero), t);
@@ -93,14 +105,24 @@ inline __m256 processPair(float* g0, float* g1, const __m256* x, const Consts& f
     minIdx = blend(lighter, _mm256_set1_ps(float(k)), minIdx);
   }
   const __m256 r = _mm256_min_ps(_mm256_div_ps(f.a, blend(noMatch, f.one, matchedW)), f.one);
+  bool keep[K];  // weight 0 before and after in every lane
   for (int k = 0; k < K; ++k) {
     const int o = k * kFields * 4;
     const __m256 replace = _mm256_and_ps(noMatch, eq(minIdx, _mm256_set1_ps(float(k))));
     nw[k] = blend(replace, f.a, nw[k]);
-    const __m256 touched = _mm256_or_ps(replace, matched[k]);
+    const int replaced = _mm256_movemask_ps(replace);
+    keep[k] = !live[k] && !replaced;
     // Means and variance change only where the component is matched or
     // replaced; a pair of groups with neither keeps them as they are.
-    if (_mm256_movemask_ps(touched)) {
+    if (!live[k]) {
+      if (!replaced) continue;
+      for (int j = 0; j < 3; ++j) {
+        float* p0 = g0 + o + 4 * (1 + j);
+        float* p1 = g1 + o + 4 * (1 + j);
+        store2(p0, p1, blend(replace, x[j], load2(p0, p1)));
+      }
+      store2(g0 + o + 16, g1 + o + 16, blend(replace, f.varInit, load2(g0 + o + 16, g1 + o + 16)));
+    } else if (replaced | _mm256_movemask_ps(matched[k])) {
       for (int j = 0; j < 3; ++j) {
         float* p0 = g0 + o + 4 * (1 + j);
         float* p1 = g1 + o + 4 * (1 + j);
@@ -116,6 +138,7 @@ inline __m256 processPair(float* g0, float* g1, const __m256* x, const Consts& f
   __m256 sum = nw[0];
   for (int k = 1; k < K; ++k) sum = _mm256_add_ps(sum, nw[k]);
   for (int k = 0; k < K; ++k) {
+    if (keep[k]) continue;  // 0 / sum is the 0 already stored
     const int o = k * kFields * 4;
     store2(g0 + o, g1 + o, _mm256_div_ps(nw[k], sum));
   }
