@@ -1,5 +1,5 @@
-// The mixture model's per-frame constants and the AVX2 row kernel that the
-// baseline code hands whole pairs of pixel groups to.
+// The mixture model's per-frame constants and the AVX2 and AVX-512 row
+// kernels that the baseline code hands whole runs of pixel groups to.
 #ifndef ZELCV_MOTION_FGMM_KERNELS_H
 #define ZELCV_MOTION_FGMM_KERNELS_H
 
@@ -25,6 +25,12 @@ namespace avx2 {
 int fgmmRow(int components, const uint8_t* src, uint8_t* dst, float* g, int width,
             const background::FrameScalars& f);
 }  // namespace avx2
+
+namespace avx512 {
+// The same for sixteen pixels at a time (four groups), in fgmm_avx512.cpp.
+int fgmmRow(int components, const uint8_t* src, uint8_t* dst, float* g, int width,
+            const background::FrameScalars& f);
+}  // namespace avx512
 }  // namespace zelcv
 
 #endif  // ZELCV_MOTION_FGMM_KERNELS_H

@@ -140,18 +140,25 @@ inline __m128 processGroup(float* g, const __m128* x, const FrameConstants& f) {
   return _mm_andnot_ps(background, _mm_castsi128_ps(_mm_set1_epi32(-1)));
 }
 
-// With `wide`, the AVX2 kernel takes each row's pixels eight at a time and
-// this loop the rest.
+enum class Wide { None, Avx2, Avx512 };
+
+// The widest kernel takes each row's pixels sixteen or eight at a time, the
+// AVX2 one a last eight, and this loop the rest. The AVX-512 kernel pays
+// from four components on; with fewer the state streams through memory as
+// fast with AVX2, whose loads need no assembling of four groups.
 template <int K>
 void runFrame(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, MixtureModel* m, const FrameConstants& f,
-              const FrameScalars& scalars, bool wide) {
+              const FrameScalars& scalars, Wide wide) {
   float* comps = componentsOf(m);
   const int width = m->head.width;
   for (int y = 0; y < m->head.height; ++y) {
     const Zel8u* s = src + int64_t(y) * srcStep;
     Zel8u* d = dst + int64_t(y) * dstStep;
     float* g = comps + int64_t(y) * m->groups * K * kFields * 4;
-    const int done = wide ? avx2::fgmmRow(K, s, d, g, width, scalars) : 0;
+    int done = 0;
+    if (K >= 4 && wide == Wide::Avx512) done = avx512::fgmmRow(K, s, d, g, width, scalars);
+    if (wide != Wide::None) done += avx2::fgmmRow(K, s + 3 * done, d + done, g + (done / 4) * K * kFields * 4,
+                                                  width - done, scalars);
     g += (done / 4) * K * kFields * 4;
     for (int x = done; x < width; x += 4, g += K * kFields * 4) {
       const int n = width - x < 4 ? width - x : 4;
@@ -216,8 +223,12 @@ ZELCV_ENTRY(zeliFGMMForeground_8u_C3R)(const Zel8u* src, int srcStep, Zel8u* dst
   const float a = p.alpha > first ? p.alpha : first;
   const FrameScalars scalars{a, 1.0f - a, a * p.complexity, p.varThreshold, p.varThresholdGen,
                              p.backgroundRatio, p.varInit, p.varMin, p.varMax};
-  const bool wide = withChosenIsa<IsaLevel::Avx2>(
-      [](auto tag) { return !std::is_same<typename decltype(tag)::Isa, simd::Sse2>::value; });
+  const Wide wide = withChosenIsa<IsaLevel::Avx512>([](auto tag) {
+    using Isa = typename decltype(tag)::Isa;
+    return std::is_same<Isa, simd::Sse2>::value ? Wide::None
+           : std::is_same<Isa, avx2::Isa>::value ? Wide::Avx2
+                                                  : Wide::Avx512;
+  });
   FrameConstants f;
   f.a = _mm_set1_ps(a);
   f.b = _mm_set1_ps(1.0f - a);
