@@ -123,6 +123,29 @@ void runFloat(const FloatSource<S>& source, D* dst, int dstStep, const Term* ter
   auto rowPass = [&](int y) {
     const S* p = source.row(y);
     float* ext = work.ext;
+    if constexpr (std::is_same<S, float>::value) {
+      // Float rows are read in place; only the two ends are built, each from
+      // its border pixels and the K - 1 row pixels next to them. Every output
+      // depends on its own window only, so the three spans give the bits of
+      // one span over the whole extended row.
+      if (p && width >= 2 * (k - 1)) {  // both ends fit the extended-row buffer
+        const size_t endPixels = size_t(k - 1) * ch;
+        float* right = ext + size_t(r) * ch + endPixels;
+        extendRowBorder<S>(p, width, ch, source.border, source.value, r, r, ext, right + endPixels);
+        memcpy(ext + size_t(r) * ch, p, endPixels * sizeof(float));
+        memcpy(right, p + n - endPixels, endPixels * sizeof(float));
+        for (int t = 0; t < nTerms; ++t) {
+          float* out = ringRow(t, y);
+          const sep::PreparedTaps<double> taps{work.taps + t * k};
+          sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{ext, ch}, out, r * ch, taps, k);
+          sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{p, ch}, out + size_t(r) * ch,
+                                 (width - k + 1) * ch, taps, k);
+          sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{right, ch},
+                                 out + size_t(width - r) * ch, r * ch, taps, k);
+        }
+        return;
+      }
+    }
     if (!p) {
       for (size_t i = 0; i < (size_t(width) + k - 1) * ch; ++i) ext[i] = float(source.value[i % ch]);
     } else {
