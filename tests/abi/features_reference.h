@@ -68,7 +68,8 @@ inline float scaleFor(int filter, int mask, int block, bool eightBit) {
 }
 
 // Scaled derivatives of every pixel. 8u: exact integers times the scale;
-// 32f: column taps then row taps in float, zero taps skipped.
+// 32f: the 32f derivative filters' sums (row taps in double, then column
+// taps in float) times the scale.
 template <typename T>
 void derivatives(const Plain<T>& src, int filter, int mask, int block, int kind, T value, Plain<float>& fx,
                  Plain<float>& fy) {
@@ -91,16 +92,20 @@ void derivatives(const Plain<T>& src, int filter, int mask, int block, int kind,
         fx.at(x, y) = float(dx) * s;
         fy.at(x, y) = float(dy) * s;
       } else {
+        // Per window row, the row taps in double (tap 0 first, every tap)
+        // rounded to float, then the column taps over those in float.
         float dx = 0.0f, dy = 0.0f;
-        for (int j = 0; j < t.k; ++j) {
-          float a = 0.0f, b = 0.0f;
-          for (int i = 0; i < t.k; ++i) {
-            const float p = float(sourcePixel(src, x - r + j, y - r + i, kind, value));
-            if (t.smooth[i] != 0.0f) a = a + t.smooth[i] * p;
-            if (t.first[i] != 0.0f) b = b + t.first[i] * p;
+        for (int i = 0; i < t.k; ++i) {
+          double a = 0.0, b = 0.0;
+          for (int j = 0; j < t.k; ++j) {
+            const double p = double(sourcePixel(src, x - r + j, y - r + i, kind, value));
+            const double pa = double(t.first[j]) * p, pb = double(t.smooth[j]) * p;
+            a = j == 0 ? pa : a + pa;
+            b = j == 0 ? pb : b + pb;
           }
-          if (t.first[j] != 0.0f) dx = dx + t.first[j] * a;
-          if (t.smooth[j] != 0.0f) dy = dy + t.smooth[j] * b;
+          const float ca = t.smooth[i] * float(a), cb = t.first[i] * float(b);
+          dx = i == 0 ? ca : dx + ca;
+          dy = i == 0 ? cb : dy + cb;
         }
         fx.at(x, y) = dx * s;
         fy.at(x, y) = dy * s;
