@@ -16,6 +16,10 @@ extern "C" {
  * call passes a ROI of exactly that size (another size gives -6, after the
  * step checks). A state of another kind or channel count gives -17.
  * Foreground masks are one byte per pixel: 255 foreground, 0 background.
+ * The C1 and C3 forms of the histogram and Gaussian models follow the same
+ * rules: a C3 model keeps its state per channel of the interleaved pixels
+ * and a pixel is foreground when any of its channels is; the rules below
+ * are per pixel and channel.
  * Checks: null pointers -8 (images, then the state), ROI size -6, steps -14
  * (32f steps not a multiple of 4: -108), the state's kind -17, the ROI
  * against the model -6, then the parameters -7. Nothing is written on failure.
@@ -38,8 +42,8 @@ typedef struct ZeliSRHNState ZeliSRHNState;
  * Detection: total = sum of the 16 counts (never 0). The channel is
  * background when count[b] * 65536 >= thresholdQ16 * total (unsigned 32-bit,
  * exact), with thresholdQ16 = max(1, floor(threshold * 65536 + 0.5)) taken in
- * double precision at InitAlloc. A pixel is foreground when any of its
- * channels is not background. Detection does not change the model.
+ * double precision at InitAlloc; otherwise it is foreground. Detection does
+ * not change the model.
  * Parameters (NULL for the defaults): threshold in (0, 1], default 0.05;
  * initCount 1..255, default 32. Out of range or NaN: -7. */
 typedef struct {
@@ -76,8 +80,8 @@ ZELCV_API ZelStatus ZELCV_CALL zeliForegroundHistogramUpdate_8u_C3R(const Zel8u*
  * single-precision operation, in the order written (no fused multiply-add).
  * InitAlloc: m = value, v = initVariance.
  * Detection: d = value - m; the channel is foreground when d * d > k2 * v,
- * with k2 = k * k computed once at InitAlloc. A pixel is foreground when any
- * of its channels is. Detection does not change the model.
+ * with k2 = k * k computed once at InitAlloc. Detection does not change the
+ * model.
  * Update: d = value - m; m = m + alpha * d; v = v + alpha * (d * d - v);
  * then v = max(v, minVariance).
  * Parameters (NULL for the defaults): alpha (learning rate) in (0, 1],

@@ -18,10 +18,11 @@ extern "C" {
  *     fx = dx * s, fy = dy * s,  s = 1 / (2^(K-1) * B) (float), K = 3 or 5,
  *     Scharr 1 / (8 B); 8u sources also divide by 255 (s = 1 / (255 * ...)).
  * 8u sources: dx, dy are the exact integers, converted to float and
- * multiplied by s. 32f sources: per column, the column taps over rows y-r..y+r
- * (tap 0 first, a multiplication and an addition per non-zero tap, in
- * float), then the row taps over those column values in the same way, then
- * the product with s.
+ * multiplied by s. 32f sources: the sums of the 32f derivative filters
+ * (zelcv/filters.h): per row y-r..y+r, the row taps over that row in double
+ * (tap 0 first, every tap) rounded once to float, then the column taps over
+ * those row sums in float (tap 0 first, a multiplication then an addition
+ * per tap), then the product with s.
  * Products xx = fx*fx, xy = fx*fy, yy = fy*fy (float) are summed over a
  * B x B block (blockSize B, 1 .. 31) covering columns x - B/2 .. x - B/2 + B - 1
  * and the same rows (B/2 rounded down): first down each column, topmost row

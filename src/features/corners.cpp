@@ -100,28 +100,24 @@ ZelStatus checkCorner(const T* src, int srcStep, Zel32f* dst, int dstStep, ZeliS
   return zelStatusOk;
 }
 
-ZelStatus cornerFrom8u(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roi, int filterType,
-                       int mask, int blockSize, ZeliBorderType border, Zel8u borderValue, Zel8u* buffer,
-                       const corners::Response& response) {
-  const int dstChannels = response.measure == Measure::kEigenValsVecs ? 6 : 1;
-  if (ZelStatus s = checkCorner(src, srcStep, dst, dstStep, roi, dstChannels, filterType, mask, blockSize, border,
-                                buffer))
-    return s;
-  if (!std::isfinite(response.k)) return zelStatusBadArgument;
-  const DerivativeKernel kernel = kernelOf(filterType, mask);
-  corners::Workspace ws(buffer, roi.width, blockSize);
+Gradient8u gradientOf(const Zel8u* src, int srcStep, ZeliSize roi, DerivativeKernel kernel, ZeliBorderType border,
+                      Zel8u borderValue, const corners::Workspace& ws) {
   Zel16s* dx16 = reinterpret_cast<Zel16s*>(ws.gradientScratch);
   Zel16s* dy16 = dx16 + roi.width;
-  const Gradient8u gradient{DerivativeRows(src, srcStep, roi, kernel, border, borderValue, dy16 + roi.width), dx16,
-                            dy16, roi.width};
-  corners::run(gradient, ws, roi, blockSize, border, derivativeScale(kernel, blockSize, true), response, dst,
-               dstStep);
-  return zelStatusOk;
+  return Gradient8u{DerivativeRows(src, srcStep, roi, kernel, border, borderValue, dy16 + roi.width), dx16, dy16,
+                    roi.width};
 }
 
-ZelStatus cornerFrom32f(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roi, int filterType,
-                        int mask, int blockSize, ZeliBorderType border, Zel32f borderValue, Zel8u* buffer,
-                        const corners::Response& response) {
+Gradient32f gradientOf(const Zel32f* src, int srcStep, ZeliSize roi, DerivativeKernel kernel,
+                       ZeliBorderType border, Zel32f borderValue, const corners::Workspace& ws) {
+  return Gradient32f{DerivativeRows32f(src, srcStep, roi, kernel, border, borderValue, ws.gradientScratch),
+                     roi.width};
+}
+
+template <typename T>
+ZelStatus cornerFrom(const T* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roi, int filterType, int mask,
+                     int blockSize, ZeliBorderType border, T borderValue, Zel8u* buffer,
+                     const corners::Response& response) {
   const int dstChannels = response.measure == Measure::kEigenValsVecs ? 6 : 1;
   if (ZelStatus s = checkCorner(src, srcStep, dst, dstStep, roi, dstChannels, filterType, mask, blockSize, border,
                                 buffer))
@@ -129,10 +125,9 @@ ZelStatus cornerFrom32f(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep
   if (!std::isfinite(response.k)) return zelStatusBadArgument;
   const DerivativeKernel kernel = kernelOf(filterType, mask);
   corners::Workspace ws(buffer, roi.width, blockSize);
-  const Gradient32f gradient{DerivativeRows32f(src, srcStep, roi, kernel, border, borderValue, ws.gradientScratch),
-                             roi.width};
-  corners::run(gradient, ws, roi, blockSize, border, derivativeScale(kernel, blockSize, false), response, dst,
-               dstStep);
+  const auto gradient = gradientOf(src, srcStep, roi, kernel, border, borderValue, ws);
+  corners::run(gradient, ws, roi, blockSize, border, derivativeScale(kernel, blockSize, sizeof(T) == 1), response,
+               dst, dstStep);
   return zelStatusOk;
 }
 
@@ -154,36 +149,36 @@ ZELCV_CORNER_QUERY(zeliHarrisCornerGetBufferSize)
 ZELCV_ENTRY(zeliMinEigenVal_8u32f_C1R)(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize,
                                        int filterType, int mask, int blockSize, ZeliBorderType borderType,
                                        Zel8u borderValue, Zel8u* buffer) {
-  return cornerFrom8u(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
-                      buffer, {Measure::kMinEigenVal, 0.0f});
+  return cornerFrom(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
+                    buffer, {Measure::kMinEigenVal, 0.0f});
 }
 ZELCV_ENTRY(zeliMinEigenVal_32f_C1R)(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize,
                                      int filterType, int mask, int blockSize, ZeliBorderType borderType,
                                      Zel32f borderValue, Zel8u* buffer) {
-  return cornerFrom32f(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
-                       buffer, {Measure::kMinEigenVal, 0.0f});
+  return cornerFrom(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
+                    buffer, {Measure::kMinEigenVal, 0.0f});
 }
 ZELCV_ENTRY(zeliEigenValsVecs_8u32f_C1R)(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize,
                                          int filterType, int mask, int blockSize, ZeliBorderType borderType,
                                          Zel8u borderValue, Zel8u* buffer) {
-  return cornerFrom8u(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
-                      buffer, {Measure::kEigenValsVecs, 0.0f});
+  return cornerFrom(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
+                    buffer, {Measure::kEigenValsVecs, 0.0f});
 }
 ZELCV_ENTRY(zeliEigenValsVecs_32f_C1R)(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize,
                                        int filterType, int mask, int blockSize, ZeliBorderType borderType,
                                        Zel32f borderValue, Zel8u* buffer) {
-  return cornerFrom32f(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
-                       buffer, {Measure::kEigenValsVecs, 0.0f});
+  return cornerFrom(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
+                    buffer, {Measure::kEigenValsVecs, 0.0f});
 }
 ZELCV_ENTRY(zeliHarrisCorner_8u32f_C1R)(const Zel8u* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize,
                                         int filterType, int mask, int blockSize, Zel32f k, ZeliBorderType borderType,
                                         Zel8u borderValue, Zel8u* buffer) {
-  return cornerFrom8u(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
-                      buffer, {Measure::kHarris, k});
+  return cornerFrom(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
+                    buffer, {Measure::kHarris, k});
 }
 ZELCV_ENTRY(zeliHarrisCorner_32f_C1R)(const Zel32f* src, int srcStep, Zel32f* dst, int dstStep, ZeliSize roiSize,
                                       int filterType, int mask, int blockSize, Zel32f k, ZeliBorderType borderType,
                                       Zel32f borderValue, Zel8u* buffer) {
-  return cornerFrom32f(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
-                       buffer, {Measure::kHarris, k});
+  return cornerFrom(src, srcStep, dst, dstStep, roiSize, filterType, mask, blockSize, borderType, borderValue,
+                    buffer, {Measure::kHarris, k});
 }

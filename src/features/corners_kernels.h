@@ -168,6 +168,47 @@ inline void eigenValsVecs(float sxx, float sxy, float syy, float* out) {
   eigenVector(a, b, c, l2, out + 4);
 }
 
+// eigenValsVecs for two pixels at once: the same double operations, the
+// rare branches of eigenVector computed for both lanes and chosen per lane.
+inline void eigenVector2(__m128d a, __m128d b, __m128d c, __m128d l, __m128d* vx, __m128d* vy) {
+  const __m128d absMask = _mm_castsi128_pd(_mm_set1_epi64x(0x7FFFFFFFFFFFFFFFll));
+  const __m128d small = _mm_set1_pd(1e-4);
+  const __m128d x1 = b, y1 = _mm_sub_pd(l, a);
+  const __m128d first = _mm_cmplt_pd(_mm_add_pd(_mm_and_pd(x1, absMask), _mm_and_pd(y1, absMask)), small);
+  const __m128d x2 = _mm_sub_pd(l, c), y2 = b;
+  const __m128d sum2 = _mm_add_pd(_mm_and_pd(x2, absMask), _mm_and_pd(y2, absMask));
+  const __m128d second = _mm_and_pd(first, _mm_cmplt_pd(sum2, small));
+  const __m128d k = _mm_div_pd(_mm_set1_pd(1.0), _mm_add_pd(sum2, _mm_set1_pd(FLT_EPSILON)));
+  auto pick = [](__m128d mask, __m128d yes, __m128d no) {
+    return _mm_or_pd(_mm_and_pd(mask, yes), _mm_andnot_pd(mask, no));
+  };
+  const __m128d x = pick(second, _mm_mul_pd(x2, k), pick(first, x2, x1));
+  const __m128d y = pick(second, _mm_mul_pd(y2, k), pick(first, y2, y1));
+  const __m128d d = _mm_div_pd(
+      _mm_set1_pd(1.0), _mm_sqrt_pd(_mm_add_pd(_mm_add_pd(_mm_mul_pd(x, x), _mm_mul_pd(y, y)), _mm_set1_pd(DBL_EPSILON))));
+  *vx = _mm_mul_pd(x, d);
+  *vy = _mm_mul_pd(y, d);
+}
+
+// Pixels i and i + 1 of sums held as floats in the low two lanes.
+inline void eigenValsVecs2(__m128 sxx, __m128 sxy, __m128 syy, float* out) {
+  const __m128d a = _mm_cvtps_pd(sxx), b = _mm_cvtps_pd(sxy), c = _mm_cvtps_pd(syy);
+  const __m128d u = _mm_mul_pd(_mm_add_pd(a, c), _mm_set1_pd(0.5));
+  const __m128d amc = _mm_sub_pd(a, c);
+  const __m128d v = _mm_sqrt_pd(_mm_add_pd(_mm_mul_pd(_mm_mul_pd(amc, amc), _mm_set1_pd(0.25)), _mm_mul_pd(b, b)));
+  const __m128d l1 = _mm_add_pd(u, v), l2 = _mm_sub_pd(u, v);
+  __m128d x1, y1, x2, y2;
+  eigenVector2(a, b, c, l1, &x1, &y1);
+  eigenVector2(a, b, c, l2, &x2, &y2);
+  // Per pixel: l1 l2 x1 y1 x2 y2.
+  const __m128 ls = _mm_unpacklo_ps(_mm_cvtpd_ps(l1), _mm_cvtpd_ps(l2));
+  const __m128 v1 = _mm_unpacklo_ps(_mm_cvtpd_ps(x1), _mm_cvtpd_ps(y1));
+  const __m128 v2 = _mm_unpacklo_ps(_mm_cvtpd_ps(x2), _mm_cvtpd_ps(y2));
+  _mm_storeu_ps(out, _mm_movelh_ps(ls, v1));
+  _mm_storeu_ps(out + 4, _mm_shuffle_ps(v2, ls, _MM_SHUFFLE(3, 2, 1, 0)));
+  _mm_storeu_ps(out + 8, _mm_movehl_ps(v2, v1));
+}
+
 // One output row from the three bordered column-sum rows.
 inline void responseRow(const float* exx, const float* exy, const float* eyy, int count, int n,
                         const Response& r, float* out) {
@@ -195,6 +236,12 @@ inline void responseRow(const float* exx, const float* exy, const float* eyy, in
     for (; i < n; ++i)
       out[i] = harris(windowSum1(exx + i, count), windowSum1(exy + i, count), windowSum1(eyy + i, count), r.k);
   } else {
+    for (; i + 4 <= n; i += 4) {
+      const __m128 sxx = windowSum4(exx + i, count), sxy = windowSum4(exy + i, count);
+      const __m128 syy = windowSum4(eyy + i, count);
+      eigenValsVecs2(sxx, sxy, syy, out + 6 * i);
+      eigenValsVecs2(_mm_movehl_ps(sxx, sxx), _mm_movehl_ps(sxy, sxy), _mm_movehl_ps(syy, syy), out + 6 * i + 12);
+    }
     for (; i < n; ++i)
       eigenValsVecs(windowSum1(exx + i, count), windowSum1(exy + i, count), windowSum1(eyy + i, count), out + 6 * i);
   }

@@ -1,16 +1,18 @@
 // FAST corners: a centre is a corner when an arc of the discrete circle
 // around it is all brighter or all darker than the centre by more than the
-// threshold. Sixteen centres are tested at once: four compass pixels reject
-// most of them (an arc of more than half the circle covers two of them),
-// the survivors get run lengths of brighter and darker pixels; scores are
-// computed for corners only. Suppression needs the scores of the rows above
-// and below, so the rows are finished one row late from a ring of three.
+// threshold. Sixteen (with AVX2 32) centres are tested at once: four compass
+// pixels reject most of them (an arc of more than half the circle covers two
+// of them), the survivors get run lengths of brighter and darker pixels;
+// scores are computed for corners only. Suppression needs the scores of the
+// rows above and below, so the rows are finished one row late from a ring of
+// three; a row without corners is finished without looking at it.
 #include <emmintrin.h>
 
 #include <climits>
 #include <cstring>
 
 #include "core/alloc.h"
+#include "core/load.h"
 #include "core/status.h"
 #include "kernels/simd.h"
 #include "features/fast_kernels.h"
@@ -34,36 +36,6 @@ int64_t fastBufferBytes(int width) { return 3 * (int64_t(width) + 2) + 64; }
 
 const FastState* stateOf(const ZeliFastNState* state) {
   return reinterpret_cast<const FastState*>(alignUp(const_cast<ZeliFastNState*>(state), 16));
-}
-
-// One row of raw scores: score + 1 for corners, 0 elsewhere.
-void scoreRow(const fast::Circle& circle, const Zel8u* row, int srcStep, int width, int threshold, int arc,
-              Zel8u* out) {
-  const int r = circle.radius;
-  std::memset(out, 0, size_t(width));
-  int x = r;
-  for (; x + 16 <= width - r; x += 16) {
-    int bits = fast::corners16(circle, row + x, srcStep, threshold, arc);
-    while (bits) {
-      const int b = __builtin_ctz(unsigned(bits));
-      out[x + b] = Zel8u(fast::score(circle, row + x + b, srcStep, arc) + 1);
-      bits &= bits - 1;
-    }
-  }
-  if (x < width - r && width - 2 * r >= 16) {
-    // The last sixteen centres, overlapping those already done.
-    const int last = width - r - 16;
-    int bits = fast::corners16(circle, row + last, srcStep, threshold, arc) >> (x - last);
-    while (bits) {
-      const int b = __builtin_ctz(unsigned(bits));
-      out[x + b] = Zel8u(fast::score(circle, row + x + b, srcStep, arc) + 1);
-      bits &= bits - 1;
-    }
-    x = width - r;
-  }
-  for (; x < width - r; ++x)
-    if (fast::isCorner(circle, row + x, srcStep, threshold, arc))
-      out[x] = Zel8u(fast::score(circle, row + x, srcStep, arc) + 1);
 }
 
 }  // namespace
@@ -113,18 +85,24 @@ ZELCV_ENTRY(zeliFastN_8u_C1R)(const Zel8u* src, int srcStep, Zel8u* dstCorner, i
   // Ring row of image row y (y may be -1 .. h): slot (y + 3) % 3, one zero
   // column on each side.
   auto ringRow = [&](int y) { return ring + size_t((y + 3) % 3) * stride + 1; };
-  auto rawRow = [&](int y, Zel8u* out) {
-    if (y < r || y >= h - r) {
-      std::memset(out - 1, 0, stride);
-      return;
-    }
-    out[-1] = out[w] = 0;
-    scoreRow(circle, src + ptrdiff_t(y) * srcStep, srcStep, w, st->threshold, st->arc, out);
+  const bool wide = useAvx2Kernels();
+  // Corners in each ring slot; -1 while the slot may hold anything. A slot
+  // is cleared only when it holds corners.
+  int found[3] = {-1, -1, -1};
+  auto rawRow = [&](int y) {
+    Zel8u* out = ringRow(y);
+    int& n = found[(y + 3) % 3];
+    if (n) std::memset(out - 1, 0, stride);
+    n = 0;
+    if (y < r || y >= h - r) return;
+    const Zel8u* row = src + ptrdiff_t(y) * srcStep;
+    n = wide ? avx2::fastScoreRow(circle, row, w, st->threshold, st->arc, out)
+             : fast::scoreRow<>(circle, row, w, st->threshold, st->arc, out);
   };
-  rawRow(-1, ringRow(-1));
-  rawRow(0, ringRow(0));
+  rawRow(-1);
+  rawRow(0);
   for (int y = 0; y < h; ++y) {
-    rawRow(y + 1, ringRow(y + 1));
+    rawRow(y + 1);
     const Zel8u* up = ringRow(y - 1);
     const Zel8u* mid = ringRow(y);
     const Zel8u* down = ringRow(y + 1);
@@ -132,6 +110,7 @@ ZELCV_ENTRY(zeliFastN_8u_C1R)(const Zel8u* src, int srcStep, Zel8u* dstCorner, i
     Zel8u* score = dstScore + ptrdiff_t(y) * dstScoreStep;
     std::memset(corner, 0, size_t(w));
     std::memset(score, 0, size_t(w));
+    if (!found[(y + 3) % 3]) continue;
     for (int x = 0; x < w; ++x) {
       // Sixteen pixels without a corner at once.
       if (x + 16 <= w && !_mm_movemask_epi8(_mm_cmpeq_epi8(
@@ -168,12 +147,19 @@ ZELCV_ENTRY(zeliFastN2DToVec_8u)(const Zel8u* srcCorner, int srcCornerStep, cons
     const Zel8u* c = srcCorner + ptrdiff_t(y) * srcCornerStep;
     const Zel8u* s = srcScore + ptrdiff_t(y) * srcScoreStep;
     for (int x = 0; x < roiSize.width; ++x) {
+      // Corners are sparse: skip 64 (then 16) empty pixels at once.
+      auto load = [&](int at) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(c + at)); };
+      while (x + 64 <= roiSize.width &&
+             _mm_movemask_epi8(_mm_cmpeq_epi8(_mm_or_si128(_mm_or_si128(load(x), load(x + 16)),
+                                                           _mm_or_si128(load(x + 32), load(x + 48))),
+                                              _mm_setzero_si128())) == 0xFFFF)
+        x += 64;
       if (x + 16 <= roiSize.width &&
-          _mm_movemask_epi8(_mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(c + x)),
-                                           _mm_setzero_si128())) == 0xFFFF) {
+          _mm_movemask_epi8(_mm_cmpeq_epi8(load(x), _mm_setzero_si128())) == 0xFFFF) {
         x += 15;
         continue;
       }
+      if (x >= roiSize.width) break;
       if (!c[x]) continue;
       if (written == capacity) {
         *count = written;

@@ -69,6 +69,34 @@ inline void vote(int* acc, int rowStride, int offset, const float* c, const floa
   }
 }
 
+// vote(..., +1) that also returns the angle whose cell is now the largest
+// above `floor` (the first such angle on ties), or -1. Different angles
+// never share a cell, so this is the vote followed by a scan of the cells.
+inline int voteBest(int* acc, int rowStride, int offset, const float* c, const float* s, int angles, int x, int y,
+                    int floor) {
+  const float fx = float(x), fy = float(y);
+  int n = 0, best = floor, bestAngle = -1;
+  const __m128 vx = _mm_set1_ps(fx), vy = _mm_set1_ps(fy);
+  alignas(16) int r[4];
+  auto bump = [&](int angle, int rho) {
+    const int v = ++acc[angle * rowStride + rho + offset];
+    if (v > best) {
+      best = v;
+      bestAngle = angle;
+    }
+  };
+  for (; n + 4 <= angles; n += 4) {
+    const __m128 t = _mm_add_ps(_mm_mul_ps(vx, _mm_loadu_ps(c + n)), _mm_mul_ps(vy, _mm_loadu_ps(s + n)));
+    _mm_store_si128(reinterpret_cast<__m128i*>(r), _mm_cvtps_epi32(t));
+    bump(n, r[0]);
+    bump(n + 1, r[1]);
+    bump(n + 2, r[2]);
+    bump(n + 3, r[3]);
+  }
+  for (; n < angles; ++n) bump(n, _mm_cvtss_si32(_mm_set_ss(fx * c[n] + fy * s[n])));
+  return bestAngle;
+}
+
 }  // namespace hough
 }  // namespace zelcv
 

@@ -158,10 +158,18 @@ ZELCV_ENTRY(zeliHoughProbLine_8u32f_C1R)(const Zel8u* src, int srcStep, ZeliSize
   const int offset = 1 + (rhos - 1) / 2;
 
   int remaining = 0;
+  const __m128i zero = _mm_setzero_si128(), set = _mm_set1_epi8(char(kSet));
   for (int y = 0; y < h; ++y) {
     const Zel8u* row = src + ptrdiff_t(y) * srcStep;
     uint8_t* m = mask + size_t(y) * w;
-    for (int x = 0; x < w; ++x) {
+    int x = 0;
+    for (; x + 16 <= w; x += 16) {
+      const __m128i empty = _mm_cmpeq_epi8(_mm_loadu_si128(reinterpret_cast<const __m128i*>(row + x)), zero);
+      _mm_storeu_si128(reinterpret_cast<__m128i*>(m + x), _mm_andnot_si128(empty, set));
+      for (unsigned bits = unsigned(_mm_movemask_epi8(empty)) ^ 0xFFFFu; bits; bits &= bits - 1)
+        list[remaining++] = ZeliPoint{x + __builtin_ctz(bits), y};
+    }
+    for (; x < w; ++x) {
       m[x] = row[x] ? kSet : kEmpty;
       if (row[x]) list[remaining++] = ZeliPoint{x, y};
     }
@@ -177,17 +185,8 @@ ZELCV_ENTRY(zeliHoughProbLine_8u32f_C1R)(const Zel8u* src, int srcStep, ZeliSize
     if (here == kEmpty) continue;
 
     // Vote, and find the strongest cell among the pixel's own.
-    hough::vote(acc, stride, offset, cosTable, sinTable, angles, p.x, p.y, 1);
+    const int bestAngle = hough::voteBest(acc, stride, offset, cosTable, sinTable, angles, p.x, p.y, threshold - 1);
     here = kVoted;
-    int best = threshold - 1, bestAngle = -1;
-    for (int n = 0; n < angles; ++n) {
-      const float t = float(p.x) * cosTable[n] + float(p.y) * sinTable[n];
-      const int v = acc[n * stride + _mm_cvtss_si32(_mm_set_ss(t)) + offset];
-      if (v > best) {
-        best = v;
-        bestAngle = n;
-      }
-    }
     if (bestAngle < 0) continue;
 
     // Walk both ways from the pixel, remembering the last set pixel.

@@ -1,39 +1,17 @@
 #include "filter/derivative.h"
 
 #include <cstring>
-#include <type_traits>
 
 #include "core/alloc.h"
-#include "filter/derivative_kernels.h"
+#include "filter/derivative_ops.h"
 
 namespace zelcv {
 
 namespace {
 
-// Both first derivatives at once: the column sums (smoothing taps) feed dx,
-// the column differences (derivative taps) feed dy.
-template <class Smooth, class First>
-struct GradientSink {
-  Zel16s* dx;
-  Zel16s* dy;
-  template <class Ops>
-  void put(int x, const typename Ops::V* a, const typename Ops::V* b) const {
-    store<Ops>(dx + x, First::template apply<Ops>(a));
-    store<Ops>(dy + x, Smooth::template apply<Ops>(b));
-  }
-  template <class Ops>
-  static void store(Zel16s* p, typename Ops::V v) {
-    if constexpr (std::is_same<Ops, deriv::VectorOps>::value)
-      _mm_storeu_si128(reinterpret_cast<__m128i*>(p), v);
-    else
-      *p = Zel16s(v);
-  }
-};
-
 template <class Smooth, class First>
 void gradientRow(const deriv::SourceRows& rows, int y, Zel16s* a, Zel16s* b, Zel16s* dx, Zel16s* dy) {
-  deriv::verticalPass<Smooth, First>(rows, y, a, b);
-  deriv::horizontalPass<Smooth::kRadius, true>(a, b, rows.roi.width, GradientSink<Smooth, First>{dx, dy});
+  deriv::engineRow(rows, y, a, b, deriv::GradientSink<Smooth, First>{dx, dy});
 }
 
 }  // namespace

@@ -56,26 +56,35 @@ class DerivativeRows {
   Zel8u* constantRow_;  // width pixels of borderValue (constant kind only)
 };
 
-// Both 3x3 Scharr derivatives of a 32f image, by the engine of the exported
-// 32f members (dx as ScharrVert, dy as ScharrHoriz, the same bits), for
-// callers that need whole derivative images. `buffer` holds
-// scharr32fBufferBytes(width) bytes at any address; the border value of the
-// constant kind is 0.
+// The derivatives of 32f images, by the engine of the exported 32f members
+// (filters_float.cpp), with the same taps as above: per term, the row taps
+// over the extended source row with products and sum in double (tap 0 first)
+// rounded once to float, then the column taps over those rows in float (tap 0
+// first, a multiplication then an addition per tap). dx is then the bits of
+// the 32f filter with derivative taps along the row and smoothing taps down
+// the column, dy of its transpose. Borders: every kind and side flag of
+// derivative filters; the constant kind takes borderValue.
+//
+// scharr32f writes both 3x3 Scharr derivative images at once (dx as
+// ScharrVert, dy as ScharrHoriz), through the engine's ring of row-pass
+// results; `buffer` holds scharr32fBufferBytes(width) bytes at any address;
+// the border value of the constant kind is 0.
 int64_t scharr32fBufferBytes(int width);
 void scharr32f(const Zel32f* src, int srcStep, ZeliSize roi, ZeliBorderType border, Zel32f* dx, int dxStep,
                Zel32f* dy, int dyStep, Zel8u* buffer);
-// The same derivatives of 32f images, in float: per column the column taps
-// over rows y - r .. y + r (tap 0 first, a multiplication and an addition per
-// non-zero tap), then the row taps over those column values in the same way.
-// Every path gives the same bits. Borders: zelBorderConstant (borderValue),
-// replicate, wrap and the mirror kinds; in-memory sides are not read.
+
+// One row at a time, in little scratch (no ring: the row-pass results an
+// output row needs are formed again for each row).
 class DerivativeRows32f {
  public:
+  // Scratch bytes that the constructor's `scratch` must provide (no alignment
+  // needed): at most 8 width + 48.
   static size_t scratchBytes(DerivativeKernel kernel, int width);
 
   DerivativeRows32f(const Zel32f* src, int srcStep, ZeliSize roi, DerivativeKernel kernel,
                     ZeliBorderType border, Zel32f borderValue, void* scratch);
 
+  // dx and dy of image row y (0 <= y < height), width values each.
   void row(int y, Zel32f* dx, Zel32f* dy) const;
 
  private:
@@ -85,8 +94,8 @@ class DerivativeRows32f {
   DerivativeKernel kernel_;
   ZeliBorderType border_;
   Zel32f borderValue_;
-  Zel32f* smooth_;  // width + 2 * radius column values (smoothing taps)
-  Zel32f* diff_;    // width + 2 * radius column values (derivative taps)
+  Zel32f* ext_;     // width + 2 * radius: the extended source row
+  Zel32f* rowSum_;  // width: one row-pass result
 };
 
 }  // namespace zelcv

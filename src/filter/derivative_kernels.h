@@ -18,26 +18,41 @@
 #include <stdint.h>
 
 #include <algorithm>
+#include <type_traits>
 #include <utility>
 
 #include "filter/border.h"
+#include "kernels/dispatch.h"
+#include "kernels/simd.h"
 #include "zelcv.h"
 
 namespace zelcv {
 namespace deriv {
 
-// Integer arithmetic on one value and on eight 16-bit lanes.
+// Integer arithmetic on one value, and on the 16-bit lanes of a vector of
+// the instruction set Isa (the SSE2 form here, the AVX2 form in
+// derivative_avx2.cpp). Stores narrow to the output types.
 struct ScalarOps {
   using V = int;
+  static constexpr bool kVector = false;
   static V zero() { return 0; }
+  static V set(int c) { return c; }
   static V add(V a, V b) { return a + b; }
   static V sub(V a, V b) { return a - b; }
   template <int C> static V mul(V v) { return v * C; }
+  template <int S> static V srai(V v) { return v >> S; }
+  static void store16(Zel16s* p, V v) { *p = Zel16s(v); }
+  static void storeS8(Zel8s* p, V v) { *p = Zel8s(v < -128 ? -128 : v > 127 ? 127 : v); }
 };
 
-struct VectorOps {
+template <class Isa> struct VectorOps;
+
+template <> struct VectorOps<simd::Sse2> {
   using V = __m128i;
+  static constexpr bool kVector = true;
+  static constexpr int kLanes = 8;
   static V zero() { return _mm_setzero_si128(); }
+  static V set(int c) { return _mm_set1_epi16(short(c)); }
   static V add(V a, V b) { return _mm_add_epi16(a, b); }
   static V sub(V a, V b) { return _mm_sub_epi16(a, b); }
   template <int C> static V mul(V v) {
@@ -47,6 +62,19 @@ struct VectorOps {
     else if constexpr (C == 8) return _mm_slli_epi16(v, 3);
     else return _mm_mullo_epi16(v, _mm_set1_epi16(C));
   }
+  template <int S> static V srai(V v) { return _mm_srai_epi16(v, S); }
+  template <int S> static V srli(V v) { return _mm_srli_epi16(v, S); }
+  static V mulhiu(V a, V b) { return _mm_mulhi_epu16(a, b); }
+  static V load16(const Zel16s* p) { return _mm_loadu_si128(reinterpret_cast<const __m128i*>(p)); }
+  // 2 kLanes pixels widened to 16 bits, in order.
+  static void loadBytes(const Zel8u* p, V& lo, V& hi) {
+    const V v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+    lo = _mm_unpacklo_epi8(v, _mm_setzero_si128());
+    hi = _mm_unpackhi_epi8(v, _mm_setzero_si128());
+  }
+  static void store16(Zel16s* p, V v) { _mm_storeu_si128(reinterpret_cast<__m128i*>(p), v); }
+  static void storeS8(Zel8s* p, V v) { _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packs_epi16(v, v)); }
+  static void storeU8(Zel8u* p, V v) { _mm_storel_epi64(reinterpret_cast<__m128i*>(p), _mm_packus_epi16(v, v)); }
 };
 
 // Taps applied without reversal: tap 0 multiplies s[0], the leftmost (or
@@ -116,10 +144,68 @@ struct NoTaps {
   static constexpr int kCount = 0;
 };
 
-// Step 1 for image row y: a[x + r] and b[x + r] for x in [-r, width + r),
-// r the radius of ColA (ColB has the same size or is NoTaps).
-template <class ColA, class ColB>
-void verticalPass(const SourceRows& rows, int y, Zel16s* a, Zel16s* b) {
+// Step 1 by vectors of Isa: a[x] and b[x] for x in [0, width) from the n
+// source rows p[0 .. n). Needs width >= 2 VectorOps<Isa>::kLanes; the last
+// block overlaps the one before it and rewrites equal values.
+template <class Isa, class ColA, class ColB>
+void verticalVector(const Zel8u* const* p, int width, Zel16s* a, Zel16s* b) {
+  using Ops = VectorOps<Isa>;
+  using V = typename Ops::V;
+  constexpr int n = ColA::kCount;
+  constexpr int block = 2 * Ops::kLanes;
+  for (int x0 = 0; x0 < width; x0 += block) {
+    const int x = x0 < width - block ? x0 : width - block;
+    V lo[n], hi[n];
+    for (int i = 0; i < n; ++i) Ops::loadBytes(p[i] + x, lo[i], hi[i]);
+    Ops::store16(a + x, ColA::template apply<Ops>(lo));
+    Ops::store16(a + x + Ops::kLanes, ColA::template apply<Ops>(hi));
+    if constexpr (ColB::kCount > 0) {
+      Ops::store16(b + x, ColB::template apply<Ops>(lo));
+      Ops::store16(b + x + Ops::kLanes, ColB::template apply<Ops>(hi));
+    }
+  }
+}
+
+// Step 2 by vectors of Isa: sink.template put<Ops>(x, wa, wb) with the
+// windows a[x .. x + 2r] and b[x .. x + 2r] (a and b point at column -r) as
+// vectors of kLanes lanes, x .. x + kLanes - 1. Needs width >= kLanes;
+// blocks may overlap at the end of the row, so a sink must not read what it
+// writes.
+template <class Isa, int r, bool kTwo, class Sink>
+void horizontalVector(const Zel16s* a, const Zel16s* b, int width, const Sink& sink) {
+  using Ops = VectorOps<Isa>;
+  using V = typename Ops::V;
+  constexpr int n = 2 * r + 1;
+  for (int x0 = 0; x0 < width; x0 += Ops::kLanes) {
+    const int x = x0 < width - Ops::kLanes ? x0 : width - Ops::kLanes;
+    V wa[n], wb[n];
+    for (int i = 0; i < n; ++i) {
+      wa[i] = Ops::load16(a + x + i);
+      if constexpr (kTwo) wb[i] = Ops::load16(b + x + i);
+    }
+    sink.template put<Ops>(x, wa, wb);
+  }
+}
+
+// Both steps of one row by vectors of Isa (width >= 2 kLanes); the border
+// columns of a and b are already in place. A sink names its kernel:
+// Sink::ColA, Sink::ColB (or NoTaps), Sink::kRadius.
+template <class Isa, class Sink>
+void vectorRow(const Zel8u* const* p, int width, Zel16s* a, Zel16s* b, const Sink& sink) {
+  constexpr int r = Sink::kRadius;
+  constexpr bool kTwo = Sink::ColB::kCount > 0;
+  verticalVector<Isa, typename Sink::ColA, typename Sink::ColB>(p, width, a + r, b + r);
+  horizontalVector<Isa, r, kTwo>(a, b, width, sink);
+}
+
+// One output row of the kernel that `sink` names: the vertical border rule
+// picks the source rows, the horizontal rule the border columns, then the
+// widest vector form the row is long enough for (every form gives the same
+// integers), or plain code on very short rows.
+template <class Sink>
+void engineRow(const SourceRows& rows, int y, Zel16s* a, Zel16s* b, const Sink& sink) {
+  using ColA = typename Sink::ColA;
+  using ColB = typename Sink::ColB;
   constexpr int r = ColA::kRadius;
   constexpr int n = 2 * r + 1;
   constexpr bool kTwo = ColB::kCount > 0;
@@ -146,53 +232,25 @@ void verticalPass(const SourceRows& rows, int y, Zel16s* a, Zel16s* b) {
       b[r + width + j] = Zel16s(ColB::template apply<ScalarOps>(sr));
     }
   }
-  a += r;
-  if constexpr (kTwo) b += r;
-  if (width >= 16) {
-    const __m128i zero = _mm_setzero_si128();
-    // The last block overlaps the one before it; it rewrites equal values.
-    for (int x0 = 0; x0 < width; x0 += 16) {
-      const int x = std::min(x0, width - 16);
-      __m128i lo[n], hi[n];
-      for (int i = 0; i < n; ++i) {
-        const __m128i v = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p[i] + x));
-        lo[i] = _mm_unpacklo_epi8(v, zero);
-        hi[i] = _mm_unpackhi_epi8(v, zero);
+  if (width >= 2 * VectorOps<simd::Sse2>::kLanes) {
+    withChosenIsa<IsaLevel::Avx2>([&](auto isa) {
+      using Isa = typename decltype(isa)::Isa;
+      // The AVX2 form reads blocks of 32 pixels.
+      if constexpr (!std::is_same<Isa, simd::Sse2>::value) {
+        if (width >= 32) return vectorRow<Isa>(p, width, a, b, sink);
       }
-      _mm_storeu_si128(reinterpret_cast<__m128i*>(a + x), ColA::template apply<VectorOps>(lo));
-      _mm_storeu_si128(reinterpret_cast<__m128i*>(a + x + 8), ColA::template apply<VectorOps>(hi));
-      if constexpr (kTwo) {
-        _mm_storeu_si128(reinterpret_cast<__m128i*>(b + x), ColB::template apply<VectorOps>(lo));
-        _mm_storeu_si128(reinterpret_cast<__m128i*>(b + x + 8), ColB::template apply<VectorOps>(hi));
-      }
-    }
+      vectorRow<simd::Sse2>(p, width, a, b, sink);
+    });
     return;
   }
   for (int x = 0; x < width; ++x) {
     int s[n];
     for (int i = 0; i < n; ++i) s[i] = p[i][x];
-    a[x] = Zel16s(ColA::template apply<ScalarOps>(s));
-    if constexpr (kTwo) b[x] = Zel16s(ColB::template apply<ScalarOps>(s));
+    a[r + x] = Zel16s(ColA::template apply<ScalarOps>(s));
+    if constexpr (kTwo) b[r + x] = Zel16s(ColB::template apply<ScalarOps>(s));
   }
-}
-
-// Step 2: sink.template put<Ops>(x, wa, wb) with the windows a[x .. x + 2r]
-// and b[x .. x + 2r] (as values or as vectors of eight lanes, x .. x + 7).
-// The sink's vector put stores eight outputs; blocks may overlap at the end
-// of the row, so a sink must not read what it writes.
-template <int r, bool kTwo, class Sink>
-void horizontalPass(const Zel16s* a, const Zel16s* b, int width, const Sink& sink) {
-  constexpr int n = 2 * r + 1;
-  if (width >= 8) {
-    for (int x0 = 0; x0 < width; x0 += 8) {
-      const int x = std::min(x0, width - 8);
-      __m128i wa[n], wb[n];
-      for (int i = 0; i < n; ++i) {
-        wa[i] = _mm_loadu_si128(reinterpret_cast<const __m128i*>(a + x + i));
-        if constexpr (kTwo) wb[i] = _mm_loadu_si128(reinterpret_cast<const __m128i*>(b + x + i));
-      }
-      sink.template put<VectorOps>(x, wa, wb);
-    }
+  if (width >= VectorOps<simd::Sse2>::kLanes) {
+    horizontalVector<simd::Sse2, r, kTwo>(a, b, width, sink);
     return;
   }
   for (int x = 0; x < width; ++x) {

@@ -123,6 +123,29 @@ void runFloat(const FloatSource<S>& source, D* dst, int dstStep, const Term* ter
   auto rowPass = [&](int y) {
     const S* p = source.row(y);
     float* ext = work.ext;
+    if constexpr (std::is_same<S, float>::value) {
+      // Float rows are read in place; only the two ends are built, each from
+      // its border pixels and the K - 1 row pixels next to them. Every output
+      // depends on its own window only, so the three spans give the bits of
+      // one span over the whole extended row.
+      if (p && width >= 2 * (k - 1)) {  // both ends fit the extended-row buffer
+        const size_t endPixels = size_t(k - 1) * ch;
+        float* right = ext + size_t(r) * ch + endPixels;
+        extendRowBorder<S>(p, width, ch, source.border, source.value, r, r, ext, right + endPixels);
+        memcpy(ext + size_t(r) * ch, p, endPixels * sizeof(float));
+        memcpy(right, p + n - endPixels, endPixels * sizeof(float));
+        for (int t = 0; t < nTerms; ++t) {
+          float* out = ringRow(t, y);
+          const sep::PreparedTaps<double> taps{work.taps + t * k};
+          sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{ext, ch}, out, r * ch, taps, k);
+          sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{p, ch}, out + size_t(r) * ch,
+                                 (width - k + 1) * ch, taps, k);
+          sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{right, ch},
+                                 out + size_t(width - r) * ch, r * ch, taps, k);
+        }
+        return;
+      }
+    }
     if (!p) {
       for (size_t i = 0; i < (size_t(width) + k - 1) * ch; ++i) ext[i] = float(source.value[i % ch]);
     } else {
@@ -227,6 +250,88 @@ ZelStatus floatQuery(ZeliSize roi, int mask, bool has5x5, int* bufferSize) {
 }  // namespace
 
 int64_t scharr32fBufferBytes(int width) { return filters::floatBufferBytes(width, 3, 1, kMaxTerms); }
+
+// ---- gradient rows of 32f images on the engine's arithmetic ---------------------
+//
+// The same row and column passes as runFloat, for callers that take one row
+// at a time and have no room for the ring: each of the K row-pass results an
+// output row needs is formed again, and the column taps are applied to it at
+// once, in tap order, so the sums are those of the ring form term for term.
+
+namespace {
+
+struct GradientTaps {
+  int k;
+  const float* smooth;
+  const float* first;
+};
+
+GradientTaps gradientTaps(DerivativeKernel kernel) {
+  switch (kernel) {
+    case DerivativeKernel::kScharr3x3: return {3, kScharr3, kFirst3};
+    case DerivativeKernel::kSobel5x5: return {5, kSmooth5, kFirst5};
+    default: return {3, kSmooth3, kFirst3};
+  }
+}
+
+// acc = tap * h for the first column tap, then acc = acc + tap * h: the
+// column pass's multiplication and addition, in the same order.
+void columnStep(float* acc, const float* h, float tap, bool first, int n) {
+  const __m128 t = _mm_set1_ps(tap);
+  int i = 0;
+  if (first) {
+    for (; i + 4 <= n; i += 4) _mm_storeu_ps(acc + i, _mm_mul_ps(t, _mm_loadu_ps(h + i)));
+    for (; i < n; ++i) acc[i] = tap * h[i];
+  } else {
+    for (; i + 4 <= n; i += 4)
+      _mm_storeu_ps(acc + i, _mm_add_ps(_mm_loadu_ps(acc + i), _mm_mul_ps(t, _mm_loadu_ps(h + i))));
+    for (; i < n; ++i) acc[i] = acc[i] + tap * h[i];
+  }
+}
+
+}  // namespace
+
+size_t DerivativeRows32f::scratchBytes(DerivativeKernel kernel, int width) {
+  // The extended source row and one row-pass result, each 16-byte aligned.
+  const size_t r = size_t(derivativeRadius(kernel));
+  return (size_t(width) + 2 * r) * sizeof(float) + size_t(width) * sizeof(float) + 32;
+}
+
+DerivativeRows32f::DerivativeRows32f(const Zel32f* src, int srcStep, ZeliSize roi, DerivativeKernel kernel,
+                                     ZeliBorderType border, Zel32f borderValue, void* scratch)
+    : src_(src), srcStep_(srcStep), roi_(roi), kernel_(kernel), border_(border), borderValue_(borderValue) {
+  ext_ = reinterpret_cast<Zel32f*>(alignUp(scratch, 16));
+  rowSum_ = reinterpret_cast<Zel32f*>(alignUp(ext_ + size_t(roi.width) + 2 * size_t(derivativeRadius(kernel)), 16));
+}
+
+void DerivativeRows32f::row(int y, Zel32f* dx, Zel32f* dy) const {
+  const GradientTaps taps = gradientTaps(kernel_);
+  const int k = taps.k, r = k / 2, width = roi_.width;
+  alignas(16) __m128d first[5], smooth[5];
+  for (int j = 0; j < k; ++j) {
+    first[j] = _mm_set1_pd(double(taps.first[j]));
+    smooth[j] = _mm_set1_pd(double(taps.smooth[j]));
+  }
+  const FloatSource<Zel32f> source{src_, srcStep_, roi_, 1, border_, &borderValue_};
+  for (int i = 0; i < k; ++i) {
+    // Row y - r + i extended by its border, as the engine's row pass builds it.
+    const Zel32f* p = source.row(y - r + i);
+    if (!p) {
+      for (int x = 0; x < width + 2 * r; ++x) ext_[x] = borderValue_;
+    } else {
+      memcpy(ext_ + r, p, size_t(width) * sizeof(float));
+      extendRowBorder<Zel32f>(p, width, 1, border_, &borderValue_, r, r, ext_, ext_ + r + width);
+    }
+    // dx: derivative taps along the row, smoothing taps down the column;
+    // dy the transpose.
+    sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{ext_, 1}, rowSum_, width,
+                           sep::PreparedTaps<double>{first}, k);
+    columnStep(dx, rowSum_, taps.smooth[i], i == 0, width);
+    sep::filterSpanAnySize(sep::DoubleSum{}, sep::RowSource<float>{ext_, 1}, rowSum_, width,
+                           sep::PreparedTaps<double>{smooth}, k);
+    columnStep(dy, rowSum_, taps.first[i], i == 0, width);
+  }
+}
 
 void scharr32f(const Zel32f* src, int srcStep, ZeliSize roi, ZeliBorderType border, Zel32f* dx, int dxStep,
                Zel32f* dy, int dyStep, Zel8u* buffer) {

@@ -13,6 +13,8 @@
 #include "core/alloc.h"
 #include "core/status.h"
 #include "filter/border.h"
+#include "filter/pyramid_gauss.h"
+#include "filter/pyramid_layer_kernels.h"
 #include "filter/pyramid_sizes.h"
 
 // The state: one block holding this head, the taps, the chain of level sizes
@@ -152,12 +154,31 @@ inline T convert(float v) {
 
 // Resamples src (srcRoi) into dst (dstRoi); pick, frac and columns hold
 // dstRoi.width entries (columns at most srcRoi.width).
+// The 8u taps as integers (in units of 1/8192) when the integer sums of a
+// row equal its float sums: every tap a 16-bit integer, and no partial sum of
+// 8-bit pixels reaching 2^24 units, below which floats add integers exactly.
+bool integerTaps(const float* taps, int K, int16_t* itaps) {
+  if (K > 63) return false;
+  double bound = 0.0;
+  for (int k = 0; k < K; ++k) {
+    const double t = double(taps[k]) * 8192.0;
+    if (t < -32768.0 || t > 32767.0 || t != double(int32_t(t))) return false;
+    itaps[k] = int16_t(t);
+    bound += (t < 0 ? -t : t) * 255.0;
+  }
+  itaps[K] = 0;
+  return bound < 16777216.0;
+}
+
 template <typename T, int kCh>
 void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, ZeliSize dstRoi,
               ZeliPyramidLayerState* st, bool down, int32_t* pick, float* frac) {
   const int K = st->kerSize, R = K / 2, w = srcRoi.width, h = srcRoi.height;
   const float* taps = st->taps;
   const bool exact = down && nearTwo(st->rate);
+  const layer::Kernels kernels = layer::chosenKernels();
+  int16_t itaps[64];
+  const bool integer = std::is_same<T, uint8_t>::value && kCh == 1 && exact && integerTaps(taps, K, itaps);
   // Needed source columns, ascending; each destination column's two picks.
   int32_t* cols = st->columns;
   int m = 0;
@@ -208,20 +229,25 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
       const int start = cols[lo] - R;
       int j = lo;
       if constexpr (std::is_same<T, uint8_t>::value) {
-        for (; j + 8 <= hi && start + 2 * (j - lo) + K + 15 <= w; j += 8) {
-          const T* q = s + start + 2 * (j - lo);
-          __m128 acc0 = _mm_setzero_ps(), acc1 = _mm_setzero_ps();
-          for (int k = 0; k < K; ++k) {
-            const __m128i even =
-                _mm_and_si128(_mm_loadu_si128(reinterpret_cast<const __m128i*>(q + k)), _mm_set1_epi16(0xFF));
-            const __m128 t = _mm_set1_ps(taps[k]);
-            const __m128 lo4 = _mm_mul_ps(t, _mm_cvtepi32_ps(_mm_unpacklo_epi16(even, _mm_setzero_si128())));
-            const __m128 hi4 = _mm_mul_ps(t, _mm_cvtepi32_ps(_mm_unpackhi_epi16(even, _mm_setzero_si128())));
-            acc0 = k == 0 ? lo4 : _mm_add_ps(acc0, lo4);
-            acc1 = k == 0 ? hi4 : _mm_add_ps(acc1, hi4);
+        if (integer) {
+          j += kernels.evenColumns8u(reinterpret_cast<const uint8_t*>(s) + start, w - start, itaps, K, hi - lo,
+                                     1.0f / 8192.0f, out + lo);
+        } else {
+          for (; j + 8 <= hi && start + 2 * (j - lo) + K + 15 <= w; j += 8) {
+            const T* q = s + start + 2 * (j - lo);
+            __m128 acc0 = _mm_setzero_ps(), acc1 = _mm_setzero_ps();
+            for (int k = 0; k < K; ++k) {
+              const __m128i even =
+                  _mm_and_si128(_mm_loadu_si128(reinterpret_cast<const __m128i*>(q + k)), _mm_set1_epi16(0xFF));
+              const __m128 t = _mm_set1_ps(taps[k]);
+              const __m128 lo4 = _mm_mul_ps(t, _mm_cvtepi32_ps(_mm_unpacklo_epi16(even, _mm_setzero_si128())));
+              const __m128 hi4 = _mm_mul_ps(t, _mm_cvtepi32_ps(_mm_unpackhi_epi16(even, _mm_setzero_si128())));
+              acc0 = k == 0 ? lo4 : _mm_add_ps(acc0, lo4);
+              acc1 = k == 0 ? hi4 : _mm_add_ps(acc1, hi4);
+            }
+            _mm_storeu_ps(out + j, acc0);
+            _mm_storeu_ps(out + j + 4, acc1);
           }
-          _mm_storeu_ps(out + j, acc0);
-          _mm_storeu_ps(out + j + 4, acc1);
         }
       }
       for (; j < hi; ++j) {
@@ -255,13 +281,7 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
         const int r = borderIndex(y - R + k, h, zelBorderMirror);
         rows[k] = hrow(r, r % K);
       }
-      // Tap by tap over the row (the same sums in the same order).
-      for (int i = 0; i < n; ++i) out[i] = taps[0] * rows[0][i];
-      for (int k = 1; k < K; ++k) {
-        const float t = taps[k];
-        const float* r = rows[k];
-        for (int i = 0; i < n; ++i) out[i] += t * r[i];
-      }
+      kernels.weightedRows(rows, taps, K, n, out);
     } else {
       // Long kernels: one ring row at a time, in tap order.
       for (int k = 0; k < K; ++k) {
@@ -280,18 +300,12 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
     if (exact) {
       int x = 0;
       if constexpr (std::is_same<T, uint8_t>::value && kCh == 1) {
-        // Columns read in order (all but clamped ones at the end): eight
-        // conversions per step, the same clamps and truncation.
+        // Columns read in order (all but clamped ones at the end) convert
+        // as a block.
         int plain = dstRoi.width;
         while (plain > 0 && pick[2 * (plain - 1)] != plain - 1) --plain;
-        const __m128 half = _mm_set1_ps(0.5f), top = _mm_set1_ps(255.0f), zero = _mm_setzero_ps();
-        auto toInt = [&](const float* p) {
-          return _mm_cvttps_epi32(_mm_min_ps(_mm_max_ps(_mm_add_ps(_mm_loadu_ps(p), half), zero), top));
-        };
-        for (; x + 8 <= plain; x += 8) {
-          const __m128i w16 = _mm_packs_epi32(toInt(f0 + x), toInt(f0 + x + 4));
-          _mm_storel_epi64(reinterpret_cast<__m128i*>(d + x), _mm_packus_epi16(w16, w16));
-        }
+        kernels.floatsToBytes(f0, plain, d);
+        x = plain;
       }
       for (; x < dstRoi.width; ++x)
         for (int c = 0; c < kCh; ++c) d[x * kCh + c] = convert<T>(f0[pick[2 * x] * kCh + c]);
@@ -307,6 +321,32 @@ void resample(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, Z
         d[x * kCh + c] = convert<T>(v0 + (v1 - v0) * sy.weight);
       }
     }
+  }
+}
+
+// The binomial five taps at rate 2 on 8u, with the destination that halving
+// gives: every product and partial sum of the float path is then a small
+// multiple of 2^-8, so exact, and its result is (sum + 128) >> 8 of the
+// binomial weights over mirrored pixels -- the 5x5 Gaussian reduction, whose
+// integer kernels this runs. Images below three rows or columns, which that
+// reduction treats apart, stay on the general path.
+template <typename T, int kCh>
+bool binomialHalving(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstStep, ZeliSize dstRoi,
+                     ZeliPyramidLayerState* st) {
+  if constexpr (!std::is_same<T, uint8_t>::value) {
+    return false;
+  } else {
+    static const float kBinomial[5] = {1.0f / 16, 4.0f / 16, 6.0f / 16, 4.0f / 16, 1.0f / 16};
+    if (st->kerSize != 5 || !nearTwo(st->rate) || memcmp(st->taps, kBinomial, sizeof kBinomial) != 0) return false;
+    if (srcRoi.width < 3 || srcRoi.height < 3 || dstRoi.width != (srcRoi.width + 1) / 2 ||
+        dstRoi.height != (srcRoi.height + 1) / 2)
+      return false;
+    // The reduction's six intermediate rows, in the state's work rows.
+    uint8_t* work = reinterpret_cast<uint8_t*>(st->ring);
+    const size_t need = 64 + 6 * pyr::downRowBytes(srcRoi.width, kCh);
+    if (size_t(reinterpret_cast<uint8_t*>(st->chain) - work) < need) return false;
+    pyr::pyrDown<T, kCh>(src, srcStep, dst, dstStep, srcRoi, work);
+    return true;
   }
 }
 
@@ -337,6 +377,7 @@ ZelStatus runLayer(const T* src, int srcStep, ZeliSize srcRoi, T* dst, int dstSt
   }
   if (srcRoi.width > st->base.width) return zelStatusBadSize;
   if (down) {
+    if (binomialHalving<T, kCh>(src, srcStep, srcRoi, dst, dstStep, dstRoi, st)) return zelStatusOk;
     resample<T, kCh>(src, srcStep, srcRoi, dst, dstStep, dstRoi, st, true, st->pick, st->frac);
     return zelStatusOk;
   }

@@ -115,6 +115,13 @@ void runIntegerRows(const P& policy, const Zel16s* kernel, int divisor, const ty
     const int64_t maxAbs = std::is_same<S, Zel8u>::value ? 255 : 32768;
     if (sep::exactInFloat(kernel, kernelSize, divisor, maxAbs, &tapSum)) {
       if constexpr (std::is_same<S, Zel8u>::value) {
+        // Non-negative taps with a power-of-two divisor: a shift, the cheapest form.
+        int shift = 0;
+        if (sep::ShiftSum<>::fits(kernel, kernelSize, divisor, &shift)) {
+          runPrepared<sep::ShiftSum<>, kChannels>(sep::ShiftSum<>{shift}, buf, kernel, scale, src, srcStep, dst, roi,
+                                                  kernelSize, xAnchor, border, borderValue);
+          return;
+        }
         if (tapSum * 255 <= 32767) {
           runPrepared<sep::ShortSum<>, kChannels>(sep::ShortSum<>{scale, divisor == 1}, buf, kernel, scale, src, srcStep,
                                                 dst, roi, kernelSize, xAnchor, border, borderValue);

@@ -55,6 +55,7 @@ template <> struct Wide<avx2::Isa> {
   static void storei(void* p, I a) { _mm256_storeu_si256(static_cast<__m256i*>(p), a); }
   static I add16(I a, I b) { return _mm256_add_epi16(a, b); }
   static I add32(I a, I b) { return _mm256_add_epi32(a, b); }
+  static I srl16(I a, int n) { return _mm256_srl_epi16(a, _mm_cvtsi32_si128(n)); }
   static I mullo16(I a, I b) { return _mm256_mullo_epi16(a, b); }
   static I mulhi16(I a, I b) { return _mm256_mulhi_epi16(a, b); }
   static I madd16(I a, I b) { return _mm256_madd_epi16(a, b); }

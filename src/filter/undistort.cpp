@@ -3,10 +3,13 @@
 #include <limits.h>
 #include <math.h>
 
+#include <type_traits>
+
 #include "core/alloc.h"
 #include "core/sizes.h"
 #include "core/status.h"
 #include "filter/undistort_kernels.h"
+#include "kernels/dispatch.h"
 
 namespace zelcv {
 namespace {
@@ -16,6 +19,8 @@ using undistort::Source;
 
 // Two float coordinates per pixel of a row, and room to align them.
 constexpr int kBufferAlign = 64;
+// Resampling through a caller's map goes by tiles (a multiple of 8 wide).
+constexpr int kBand = 16, kSpan = 256;
 
 SizeCalc bufferBytes(int width) { return SizeCalc(width) * 8 + kBufferAlign; }
 
@@ -24,6 +29,39 @@ bool validCamera(float fx, float fy, float cx, float cy, float k1, float k2, flo
   for (float v : all)
     if (!isfinite(v)) return false;
   return fx != 0.0f && fy != 0.0f;
+}
+
+// Whether 8u three-channel rows of this source take the AVX2 kernel: the
+// processor has it and every neighbour lies at a 32-bit offset.
+template <typename T, int C>
+bool wideRows(const Source<T>& s) {
+  if (!std::is_same<T, uint8_t>::value || C != 3) return false;
+  if (int64_t(s.step) * s.height > INT_MAX) return false;
+  return withChosenIsa<IsaLevel::Avx2>([](auto tag) {
+    return !std::is_same<typename decltype(tag)::Isa, simd::Sse2>::value;
+  });
+}
+
+// One row; groups of eight whose neighbourhoods are inside go to the AVX2
+// kernel when `wide`, every other pixel to the baseline one.
+template <typename T, int C>
+void resampleRow(const Source<T>& s, bool wide, const float* mx, const float* my, T* dst, int width) {
+  if constexpr (std::is_same<T, uint8_t>::value && C == 3) {
+    if (wide) {
+      int j = 0;
+      for (;;) {
+        j += avx2::remapRow8uC3(s.data, s.step, s.width - 2, s.height - 1, mx + j, my + j, dst + 3 * j, width - j);
+        if (width - j < 8) break;
+        // A group with a neighbourhood outside.
+        undistort::remapQuad<T, C>(s, mx + j, my + j, dst + 3 * j);
+        undistort::remapQuad<T, C>(s, mx + j + 4, my + j + 4, dst + 3 * j + 12);
+        j += 8;
+      }
+      undistort::remapRow<T, C>(s, mx + j, my + j, dst + 3 * j, width - j);
+      return;
+    }
+  }
+  undistort::remapRow<T, C>(s, mx, my, dst, width);
 }
 
 template <typename T, int C>
@@ -36,10 +74,11 @@ ZelStatus runUndistort(const T* src, int srcStep, T* dst, int dstStep, ZeliSize 
   float* u = reinterpret_cast<float*>(alignUp(buffer, kBufferAlign));
   float* v = u + roi.width;
   const Source<T> source{src, srcStep, roi.width, roi.height};
+  const bool wide = wideRows<T, C>(source);
   for (int i = 0; i < roi.height; ++i) {
     undistort::mapRow(model, i, roi.width, u, v);
     T* out = reinterpret_cast<T*>(reinterpret_cast<char*>(dst) + ptrdiff_t(dstStep) * i);
-    undistort::remapRow<T, C>(source, u, v, out, roi.width);
+    resampleRow<T, C>(source, wide, u, v, out, roi.width);
   }
   return zelStatusOk;
 }
@@ -59,11 +98,22 @@ ZelStatus runRemap(const T* src, int srcStep, ZeliSize srcSize, const float* xMa
   if (srcStep & in.alignMask) return zelStatusMisalignedStep;
   if (static_cast<const void*>(src) == static_cast<const void*>(dst)) return zelStatusInPlaceNotSupported;
   const Source<T> source{src, srcStep, srcSize.width, srcSize.height};
-  for (int i = 0; i < roi.height; ++i) {
-    const float* mx = reinterpret_cast<const float*>(reinterpret_cast<const char*>(xMap) + ptrdiff_t(xMapStep) * i);
-    const float* my = reinterpret_cast<const float*>(reinterpret_cast<const char*>(yMap) + ptrdiff_t(yMapStep) * i);
-    T* out = reinterpret_cast<T*>(reinterpret_cast<char*>(dst) + ptrdiff_t(dstStep) * i);
-    undistort::remapRow<T, C>(source, mx, my, out, roi.width);
+  const bool wide = wideRows<T, C>(source);
+  // Tiles of kBand rows and kSpan columns: the source pixels a tile reads
+  // stay in the cache while it is written, wherever the map leads.
+  for (int top = 0; top < roi.height; top += kBand) {
+    const int bottom = roi.height - top < kBand ? roi.height : top + kBand;
+    for (int left = 0; left < roi.width; left += kSpan) {
+      const int count = roi.width - left < kSpan ? roi.width - left : kSpan;
+      for (int i = top; i < bottom; ++i) {
+        const float* mx =
+            reinterpret_cast<const float*>(reinterpret_cast<const char*>(xMap) + ptrdiff_t(xMapStep) * i) + left;
+        const float* my =
+            reinterpret_cast<const float*>(reinterpret_cast<const char*>(yMap) + ptrdiff_t(yMapStep) * i) + left;
+        T* out = reinterpret_cast<T*>(reinterpret_cast<char*>(dst) + ptrdiff_t(dstStep) * i) + ptrdiff_t(left) * C;
+        resampleRow<T, C>(source, wide, mx, my, out, count);
+      }
+    }
   }
   return zelStatusOk;
 }

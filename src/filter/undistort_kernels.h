@@ -293,31 +293,46 @@ struct QuadKernel<float, 3> {
   }
 };
 
-// One destination row of `width` pixels from the maps' row; quads whose
-// neighbourhoods lie inside the source take the vector kernel, the rest
-// (and the last pixels) the scalar one.
+// Four destination pixels: the vector kernel when their neighbourhoods lie
+// inside the source, else the scalar one.
 template <typename T, int C>
-void remapRow(const Source<T>& s, const float* mx, const float* my, T* dst, int width) {
+inline void remapQuad(const Source<T>& s, const float* mx, const float* my, T* dst) {
   using K = QuadKernel<T, C>;
   const int xLimit = s.width - K::kMargin + 1;  // ix < xLimit
   const int yLimit = s.height - 1;              // iy < yLimit
-  int j = 0;
-  for (; j <= width - 4; j += 4) {
-    const Quad q = makeQuad(mx + j, my + j);
-    if (quadInside(q, xLimit, yLimit)) {
-      K::run(s, q, dst + j * C);
-    } else {
-      alignas(16) int32_t X[4], Y[4];
-      _mm_store_si128(reinterpret_cast<__m128i*>(X), q.X);
-      _mm_store_si128(reinterpret_cast<__m128i*>(Y), q.Y);
-      for (int k = 0; k < 4; ++k) samplePixel<T, C>(s, X[k], Y[k], dst + (j + k) * C);
-    }
+  const Quad q = makeQuad(mx, my);
+  if (quadInside(q, xLimit, yLimit)) {
+    K::run(s, q, dst);
+  } else {
+    alignas(16) int32_t X[4], Y[4];
+    _mm_store_si128(reinterpret_cast<__m128i*>(X), q.X);
+    _mm_store_si128(reinterpret_cast<__m128i*>(Y), q.Y);
+    for (int k = 0; k < 4; ++k) samplePixel<T, C>(s, X[k], Y[k], dst + k * C);
   }
+}
+
+// One destination row of `width` pixels from the maps' row, by quads, then
+// the last pixels one by one.
+template <typename T, int C>
+void remapRow(const Source<T>& s, const float* mx, const float* my, T* dst, int width) {
+  int j = 0;
+  for (; j <= width - 4; j += 4) remapQuad<T, C>(s, mx + j, my + j, dst + j * C);
   for (; j < width; ++j)
     samplePixel<T, C>(s, quantise(simd::loadOne(mx + j)), quantise(simd::loadOne(my + j)), dst + j * C);
 }
 
 }  // namespace undistort
+
+namespace avx2 {
+// The AVX2 form for 8u three-channel rows, built in undistort_avx2.cpp:
+// resamples groups of eight pixels from the row's start for as long as
+// every neighbourhood of a group lies inside (ix < xLimit, iy < yLimit, no
+// negative index) and returns how many pixels it wrote (a multiple of 8).
+// Neighbours are gathered at 32-bit offsets from `data`: step * height must
+// not exceed INT_MAX.
+int remapRow8uC3(const uint8_t* data, int step, int xLimit, int yLimit, const float* mx, const float* my,
+                 uint8_t* dst, int width);
+}  // namespace avx2
 }  // namespace zelcv
 
 #endif  // ZELCV_FILTER_UNDISTORT_KERNELS_H

@@ -6,6 +6,15 @@
 // border routine) and computes every output row from the rows its elements
 // read. Rows are copied before the output row that overwrites them is
 // written, so src == dst works.
+//
+// An 8u function that is a sum of a column part and a row part, v(i, j) =
+// g(i) + h(j), with every value of one sign, is applied in two passes: each
+// ring row is replaced by its dilation (erosion) with g as it arrives, and
+// the output row combines mh ring rows with h. Integer maxima distribute
+// over the sum, and with g and h of one sign the saturation between the
+// passes loses nothing (a term pushed below 0 by g stays below 0 after h,
+// one pushed above 255 stays above), so the bits are those of the full
+// window: mw + mh terms per pixel instead of mw * mh.
 #include <limits.h>
 #include <string.h>
 
@@ -30,6 +39,8 @@ struct GrayHeader {
   int32_t maxRoiWidth;
   int32_t ringStride;  // bytes of one extended row, a multiple of 32
   int32_t groups[3];   // elements of value 0, of the first and of the second kind
+  int32_t separable;   // 8u: two passes, groups for g and columnGroups for h
+  int32_t columnGroups[3];
 };
 constexpr int kHeaderBytes = 64;
 static_assert(sizeof(GrayHeader) <= kHeaderBytes, "header slot");
@@ -98,6 +109,43 @@ ElementValue valueOf(Zel32f v) {
   return e;
 }
 
+// Parts of one sign, longest kept: wider functions take the general path.
+constexpr int kMaxPart = 64;
+
+// Whether an 8u function (each value clamped to -255..255 first, which
+// changes no result) is g(i) + h(j) with all values <= 0 or all >= 0; if so
+// fills g (mw values) and h (mh values), each of that sign. A 1-wide or
+// 1-high function gains nothing and is not split.
+template <typename V>
+bool separableParts(const V* mask, ZeliSize maskSize, int64_t* g, int64_t* h) {
+  if constexpr (!std::is_same<V, Zel32s>::value) {
+    return false;
+  } else {
+    const int mw = maskSize.width, mh = maskSize.height;
+    if (mw < 2 || mh < 2 || mw > kMaxPart || mh > kMaxPart) return false;
+    auto c = [&](int i, int j) {
+      const int64_t v = mask[j * mw + i];
+      return v < -255 ? -255 : v > 255 ? 255 : v;
+    };
+    int64_t lo = c(0, 0), hi = c(0, 0);
+    for (int j = 0; j < mh; ++j)
+      for (int i = 0; i < mw; ++i) {
+        const int64_t v = c(i, j);
+        if (v != c(i, 0) + c(0, j) - c(0, 0)) return false;
+        lo = v < lo ? v : lo;
+        hi = v > hi ? v : hi;
+      }
+    if (lo < 0 && hi > 0) return false;
+    // g(i) = c(i, 0) - m and h(j) = c(0, j) - c(0, 0) + m, with m the
+    // largest (all <= 0) or smallest (all >= 0) of the first row.
+    int64_t m = c(0, 0);
+    for (int i = 1; i < mw; ++i) m = hi <= 0 ? (c(i, 0) > m ? c(i, 0) : m) : (c(i, 0) < m ? c(i, 0) : m);
+    for (int i = 0; i < mw; ++i) g[i] = c(i, 0) - m;
+    for (int j = 0; j < mh; ++j) h[j] = c(0, j) - c(0, 0) + m;
+    return true;
+  }
+}
+
 // Checks and builds in `block` (or only checks, for a null block and
 // `allocate`, then allocates).
 template <typename V>
@@ -117,7 +165,7 @@ ZelStatus build(int dataType, int elementSize, int roiWidth, const V* mask, Zeli
   const Layout l = layoutFor(roiWidth, maskSize.width, maskSize.height, elementSize);
   uint8_t* base = stateStart(block);
   GrayHeader h = {dataType, maskSize.width, maskSize.height, anchor.x, anchor.y, roiWidth, int32_t(l.ringStride),
-                  {0, 0, 0}};
+                  {0, 0, 0}, 0, {0, 0, 0}};
   // 8u elements are kept in three groups, each in row-major order: value 0
   // (the pixel itself), positive (one saturating addition) and negative
   // (one saturating subtraction); integer maxima do not depend on the
@@ -126,7 +174,25 @@ ZelStatus build(int dataType, int elementSize, int roiWidth, const V* mask, Zeli
   auto* values = reinterpret_cast<ElementValue*>(base + l.values);
   const int32_t area = maskSize.width * maskSize.height;
   int32_t k = 0;
-  if (dataType == zel8u) {
+  int64_t g[kMaxPart], hv[kMaxPart];
+  if (dataType == zel8u && separableParts(mask, maskSize, g, hv)) {
+    h.separable = 1;
+    // Row pass: elements i with values g(i); column pass: rows j with h(j).
+    for (int pass = 0; pass < 2; ++pass) {
+      const int n = pass == 0 ? maskSize.width : maskSize.height;
+      const int64_t* part = pass == 0 ? g : hv;
+      int32_t* counts = pass == 0 ? h.groups : h.columnGroups;
+      for (int group = 0; group < 3; ++group)
+        for (int32_t e = 0; e < n; ++e) {
+          const int64_t v = part[e];
+          if ((group == 0 && v == 0) || (group == 1 && v > 0) || (group == 2 && v < 0)) {
+            order[k] = e;
+            values[k++] = valueOf(Zel32s(v));
+            ++counts[group];
+          }
+        }
+    }
+  } else if (dataType == zel8u) {
     for (int group = 0; group < 3; ++group)
       for (int32_t e = 0; e < area; ++e) {
         const int64_t v = int64_t(mask[e]);
@@ -155,24 +221,30 @@ int typeCode() {
 
 template <typename T>
 void rowKernel(bool dilate, const T* const* sources, const ElementValue* values, const int* groups, T* dst,
-               int width) {
+               int width, bool inPlace = false) {
   withChosenIsa<IsaLevel::Avx2>([&](auto tag) {
     using Isa = typename decltype(tag)::Isa;
     if constexpr (std::is_same<Isa, simd::Sse2>::value)
-      graymorph::row<T, simd::Sse2>(dilate, sources, values, groups, dst, width);
+      graymorph::row<T, simd::Sse2>(dilate, sources, values, groups, dst, width, inPlace);
     else
-      graymorph::rowAvx2(dilate, sources, values, groups, dst, width);
+      graymorph::rowAvx2(dilate, sources, values, groups, dst, width, inPlace);
   });
 }
 
-// Copies source row r (any integer; rows outside the ROI as the border says)
-// into an extended ring row.
+// The row that stands for source row r (any integer; rows outside the ROI
+// as the border says).
 template <typename T>
-void extendRow(const T* src, int srcStep, ZeliSize roi, ZeliBorderType border, int r, int ax, int right, T* out) {
+const T* sourceRow(const T* src, int srcStep, ZeliSize roi, ZeliBorderType border, int r) {
   int row = r;
   if (r < 0 && !inMemoryTop(border)) row = 0;
   if (r >= roi.height && !inMemoryBottom(border)) row = roi.height - 1;
-  const T* p = reinterpret_cast<const T*>(reinterpret_cast<const uint8_t*>(src) + int64_t(row) * srcStep);
+  return reinterpret_cast<const T*>(reinterpret_cast<const uint8_t*>(src) + int64_t(row) * srcStep);
+}
+
+// Copies source row r into an extended ring row.
+template <typename T>
+void extendRow(const T* src, int srcStep, ZeliSize roi, ZeliBorderType border, int r, int ax, int right, T* out) {
+  const T* p = sourceRow(src, srcStep, roi, border, r);
   memcpy(out + ax, p, size_t(roi.width) * sizeof(T));
   extendRowBorder<T>(p, roi.width, 1, border, nullptr, ax, right, out, out + ax + roi.width);
 }
@@ -195,6 +267,42 @@ void run(bool dilate, const T* src, int srcStep, T* dst, int dstStep, ZeliSize r
   // index modulo mh equal to s.
   auto slot = [&](int64_t r) { return int((r % mh + mh) % mh); };
   auto slotRow = [&](int64_t r) { return reinterpret_cast<T*>(ring + int64_t(slot(r)) * h.ringStride); };
+  if (h.separable) {
+    // The row pass of source row r into ring row `out` (output x at x).
+    // Rows at least twice the window wide are read where they lie, only
+    // the ends through small extended copies; narrower ones are extended
+    // into the ring row and replaced by their pass in place.
+    const int w = roi.width;
+    auto rowPass = [&](int64_t r, T* out) {
+      if (w < 2 * mw) {
+        extendRow(src, srcStep, roi, border, int(r), ax, right, out);
+        for (int k = 0; k < mw; ++k) sources[k] = out + order[k];
+        rowKernel<T>(dilate, sources, values, h.groups, out, w, true);
+        return;
+      }
+      const T* p = sourceRow(src, srcStep, roi, border, int(r));
+      // Positions -ax .. mw - 2 and w - mw + 1 .. w + right - 1.
+      T head[2 * kMaxPart], tail[2 * kMaxPart];
+      extendRowBorder<T>(p, w, 1, border, nullptr, ax, right, head, tail + mw - 1);
+      memcpy(head + ax, p, size_t(mw - 1) * sizeof(T));
+      memcpy(tail, p + w - (mw - 1), size_t(mw - 1) * sizeof(T));
+      for (int k = 0; k < mw; ++k) sources[k] = head + order[k];
+      graymorph::rowScalar(dilate, sources, values, mw, out, 0, ax);
+      for (int k = 0; k < mw; ++k) sources[k] = p + order[k];
+      rowKernel<T>(dilate, sources, values, h.groups, out + ax, w - mw + 1);
+      for (int k = 0; k < mw; ++k) sources[k] = tail + order[k];
+      graymorph::rowScalar(dilate, sources, values, mw, out + w - right, 0, right);
+    };
+    for (int j = 0; j < mh - 1; ++j) rowPass(j - ay, slotRow(j - ay));
+    for (int y = 0; y < roi.height; ++y) {
+      const int64_t last = int64_t(y) - ay + mh - 1;
+      rowPass(last, slotRow(last));
+      for (int j = 0; j < mh; ++j) sources[j] = slotRow(int64_t(y) - ay + order[mw + j]);
+      T* out = reinterpret_cast<T*>(reinterpret_cast<uint8_t*>(dst) + int64_t(y) * dstStep);
+      rowKernel<T>(dilate, sources, values + mw, h.columnGroups, out, roi.width);
+    }
+    return;
+  }
   for (int j = 0; j < mh - 1; ++j) extendRow(src, srcStep, roi, border, j - ay, ax, right, slotRow(j - ay));
   for (int y = 0; y < roi.height; ++y) {
     const int64_t last = int64_t(y) - ay + mh - 1;

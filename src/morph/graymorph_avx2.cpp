@@ -49,13 +49,13 @@ template <> struct Ops<float, avx2::Isa> {
 };
 
 void rowAvx2(bool dilate, const uint8_t* const* sources, const ElementValue* values, const int* groups,
-             uint8_t* dst, int width) {
-  row<uint8_t, avx2::Isa>(dilate, sources, values, groups, dst, width);
+             uint8_t* dst, int width, bool inPlace) {
+  row<uint8_t, avx2::Isa>(dilate, sources, values, groups, dst, width, inPlace);
 }
 
 void rowAvx2(bool dilate, const float* const* sources, const ElementValue* values, const int* groups, float* dst,
-             int width) {
-  row<float, avx2::Isa>(dilate, sources, values, groups, dst, width);
+             int width, bool inPlace) {
+  row<float, avx2::Isa>(dilate, sources, values, groups, dst, width, inPlace);
 }
 
 }  // namespace graymorph

@@ -143,14 +143,22 @@ inline void block(const T* const* sources, const ElementValue* values, const int
 
 // Four vectors of output per pass over the elements, then single vectors,
 // then the last vector again overlapping (its pixels get the same values).
+// In place (dst is the row the sources point into, each output at or left
+// of what it reads) the last pixels are taken one by one instead: an
+// overlapping vector would read outputs already written.
 template <typename T, typename Isa, bool kDilate>
-void rowVector(const T* const* sources, const ElementValue* values, const int* groups, T* dst, int width) {
+void rowVector(const T* const* sources, const ElementValue* values, const int* groups, T* dst, int width,
+               bool inPlace) {
   constexpr int L = Ops<T, Isa>::kLanes;
   int x = 0;
   for (; x + 4 * L <= width; x += 4 * L) block<T, Isa, kDilate, 4>(sources, values, groups, dst, x);
   for (;; x += L) {
     if (x + L > width) {
       if (x == width) return;
+      if (inPlace) {
+        rowScalar(kDilate, sources, values, groups[0] + groups[1] + groups[2], dst, x, width);
+        return;
+      }
       x = width - L;
     }
     block<T, Isa, kDilate, 1>(sources, values, groups, dst, x);
@@ -159,21 +167,22 @@ void rowVector(const T* const* sources, const ElementValue* values, const int* g
 }
 
 template <typename T, typename Isa>
-void row(bool dilate, const T* const* sources, const ElementValue* values, const int* groups, T* dst, int width) {
+void row(bool dilate, const T* const* sources, const ElementValue* values, const int* groups, T* dst, int width,
+         bool inPlace) {
   if (width < Ops<T, Isa>::kLanes) {
     rowScalar(dilate, sources, values, groups[0] + groups[1] + groups[2], dst, 0, width);
   } else if (dilate) {
-    rowVector<T, Isa, true>(sources, values, groups, dst, width);
+    rowVector<T, Isa, true>(sources, values, groups, dst, width, inPlace);
   } else {
-    rowVector<T, Isa, false>(sources, values, groups, dst, width);
+    rowVector<T, Isa, false>(sources, values, groups, dst, width, inPlace);
   }
 }
 
 // The AVX2 forms, built in graymorph_avx2.cpp.
 void rowAvx2(bool dilate, const uint8_t* const* sources, const ElementValue* values, const int* groups,
-             uint8_t* dst, int width);
+             uint8_t* dst, int width, bool inPlace);
 void rowAvx2(bool dilate, const float* const* sources, const ElementValue* values, const int* groups, float* dst,
-             int width);
+             int width, bool inPlace);
 
 }  // namespace graymorph
 }  // namespace zelcv

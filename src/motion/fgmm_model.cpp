@@ -6,15 +6,18 @@
 #include <math.h>
 #include <string.h>
 
+#include <type_traits>
+
 #include "core/status.h"
+#include "kernels/dispatch.h"
 #include "motion/background_state.h"
+#include "motion/fgmm_kernels.h"
 
 namespace zelcv {
 namespace background {
 namespace {
 
 constexpr int kMaxComponents = 8;
-constexpr int kFields = 5;  // w, u0, u1, u2, v
 constexpr uint32_t kFrameCap = 1u << 30;
 
 struct MixtureModel {
@@ -137,15 +140,27 @@ inline __m128 processGroup(float* g, const __m128* x, const FrameConstants& f) {
   return _mm_andnot_ps(background, _mm_castsi128_ps(_mm_set1_epi32(-1)));
 }
 
+enum class Wide { None, Avx2, Avx512 };
+
+// The widest kernel takes each row's pixels sixteen or eight at a time, the
+// AVX2 one a last eight, and this loop the rest. The AVX-512 kernel pays
+// from four components on; with fewer the state streams through memory as
+// fast with AVX2, whose loads need no assembling of four groups.
 template <int K>
-void runFrame(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, MixtureModel* m, const FrameConstants& f) {
+void runFrame(const Zel8u* src, int srcStep, Zel8u* dst, int dstStep, MixtureModel* m, const FrameConstants& f,
+              const FrameScalars& scalars, Wide wide) {
   float* comps = componentsOf(m);
   const int width = m->head.width;
   for (int y = 0; y < m->head.height; ++y) {
     const Zel8u* s = src + int64_t(y) * srcStep;
     Zel8u* d = dst + int64_t(y) * dstStep;
     float* g = comps + int64_t(y) * m->groups * K * kFields * 4;
-    for (int x = 0; x < width; x += 4, g += K * kFields * 4) {
+    int done = 0;
+    if (K >= 4 && wide == Wide::Avx512) done = avx512::fgmmRow(K, s, d, g, width, scalars);
+    if (wide != Wide::None) done += avx2::fgmmRow(K, s + 3 * done, d + done, g + (done / 4) * K * kFields * 4,
+                                                  width - done, scalars);
+    g += (done / 4) * K * kFields * 4;
+    for (int x = done; x < width; x += 4, g += K * kFields * 4) {
       const int n = width - x < 4 ? width - x : 4;
       __m128 px[3];
       loadPixels(s + 3 * x, n, px);
@@ -206,6 +221,14 @@ ZELCV_ENTRY(zeliFGMMForeground_8u_C3R)(const Zel8u* src, int srcStep, Zel8u* dst
   const ZeliFGMMParams& p = m->p;
   const float first = 1.0f / float(2 * m->frames + 2);
   const float a = p.alpha > first ? p.alpha : first;
+  const FrameScalars scalars{a, 1.0f - a, a * p.complexity, p.varThreshold, p.varThresholdGen,
+                             p.backgroundRatio, p.varInit, p.varMin, p.varMax};
+  const Wide wide = withChosenIsa<IsaLevel::Avx512>([](auto tag) {
+    using Isa = typename decltype(tag)::Isa;
+    return std::is_same<Isa, simd::Sse2>::value ? Wide::None
+           : std::is_same<Isa, avx2::Isa>::value ? Wide::Avx2
+                                                  : Wide::Avx512;
+  });
   FrameConstants f;
   f.a = _mm_set1_ps(a);
   f.b = _mm_set1_ps(1.0f - a);
@@ -219,14 +242,14 @@ ZELCV_ENTRY(zeliFGMMForeground_8u_C3R)(const Zel8u* src, int srcStep, Zel8u* dst
   f.one = _mm_set1_ps(1.0f);
   f.zero = _mm_setzero_ps();
   switch (m->components) {
-    case 1: runFrame<1>(src, srcStep, dst, dstStep, m, f); break;
-    case 2: runFrame<2>(src, srcStep, dst, dstStep, m, f); break;
-    case 3: runFrame<3>(src, srcStep, dst, dstStep, m, f); break;
-    case 4: runFrame<4>(src, srcStep, dst, dstStep, m, f); break;
-    case 5: runFrame<5>(src, srcStep, dst, dstStep, m, f); break;
-    case 6: runFrame<6>(src, srcStep, dst, dstStep, m, f); break;
-    case 7: runFrame<7>(src, srcStep, dst, dstStep, m, f); break;
-    default: runFrame<8>(src, srcStep, dst, dstStep, m, f); break;
+    case 1: runFrame<1>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
+    case 2: runFrame<2>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
+    case 3: runFrame<3>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
+    case 4: runFrame<4>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
+    case 5: runFrame<5>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
+    case 6: runFrame<6>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
+    case 7: runFrame<7>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
+    default: runFrame<8>(src, srcStep, dst, dstStep, m, f, scalars, wide); break;
   }
   if (m->frames < kFrameCap) ++m->frames;
   return zelStatusOk;

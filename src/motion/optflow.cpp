@@ -7,7 +7,9 @@
 #include <string.h>
 
 #include <cfloat>
+#include <algorithm>
 #include <cmath>
+#include <type_traits>
 
 #include "core/alloc.h"
 #include "core/load.h"
@@ -22,6 +24,8 @@ namespace optflow {
 namespace {
 
 constexpr float kScale = 1.0f / 32;
+// Points are ordered for cache locality in chunks of this many.
+constexpr int kChunkBits = 8, kChunk = 1 << kChunkBits;
 // The square root of single-precision epsilon: a step that cancels the
 // previous one to within this has met an oscillation.
 constexpr double kOscillation = 0.0003452669770922512;
@@ -42,33 +46,69 @@ void scaleRows(float* p, size_t n) {
   for (; i < n; ++i) p[i] *= kScale;
 }
 
-// Whole-level derivative images into w.gx and w.gy, `size.width` floats a row.
+// Whole-level derivative images of an 8-bit level: the filters' 16-bit
+// results (32 times the derivative) straight into w.gx and w.gy,
+// `size.width` values a row; the windows scale them as they read them.
 void levelGradients(const LevelImage<Zel8u>& im, const WorkLayout& w) {
   const int width = im.size.width;
-  const size_t rowsBytes = DerivativeRows::scratchBytes(DerivativeKernel::kScharr3x3, width);
-  Zel16s* dx = reinterpret_cast<Zel16s*>(alignUp(static_cast<uint8_t*>(w.scratch) + rowsBytes, 16));
-  Zel16s* dy = dx + ((size_t(width) + 7) & ~size_t(7));
   const DerivativeRows rows(im.data, im.step, im.size, DerivativeKernel::kScharr3x3, zelBorderReplicate, 0,
                             w.scratch);
-  const __m128 k = _mm_set1_ps(kScale);
-  for (int y = 0; y < im.size.height; ++y) {
-    rows.row(y, dx, dy);
-    float* ox = rowAt(w.gx, width, y);
-    float* oy = rowAt(w.gy, width, y);
-    int x = 0;
-    for (; x + 8 <= width; x += 8) {
-      const __m128i a = _mm_loadu_si128(reinterpret_cast<const __m128i*>(dx + x));
-      const __m128i b = _mm_loadu_si128(reinterpret_cast<const __m128i*>(dy + x));
-      // Sign-extend by unpacking into the high halves and shifting down.
-      _mm_storeu_ps(ox + x, _mm_mul_ps(_mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(a, a), 16)), k));
-      _mm_storeu_ps(ox + x + 4, _mm_mul_ps(_mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpackhi_epi16(a, a), 16)), k));
-      _mm_storeu_ps(oy + x, _mm_mul_ps(_mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(b, b), 16)), k));
-      _mm_storeu_ps(oy + x + 4, _mm_mul_ps(_mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpackhi_epi16(b, b), 16)), k));
+  Zel16s* gx = reinterpret_cast<Zel16s*>(w.gx);
+  Zel16s* gy = reinterpret_cast<Zel16s*>(w.gy);
+  for (int y = 0; y < im.size.height; ++y) rows.row(y, gx + ptrdiff_t(y) * width, gy + ptrdiff_t(y) * width);
+}
+
+inline __m128 scaledLoad4(const Zel16s* p) {
+  const __m128i v = _mm_loadl_epi64(reinterpret_cast<const __m128i*>(p));
+  return _mm_mul_ps(_mm_cvtepi32_ps(_mm_srai_epi32(_mm_unpacklo_epi16(v, v), 16)), _mm_set1_ps(kScale));
+}
+
+// The sub-pixel copy of an n x n derivative window from a 16-bit plane:
+// every tap is scaled by 1/32 (exactly: a power of two) before the copy's
+// blend, ((t00 w00 + t01 w01) + t10 w10) + t11 w11, so the values equal
+// those of the copy from a scaled float plane. Rows and columns clamp to
+// the plane as the copy's do. The values go out converted to double, as
+// the sums want them.
+void copyScaledWindow(const Zel16s* plane, ZeliSize size, double* dst, int dstStride, int n,
+                      const subpix::Placement& p, bool wide) {
+  const int64_t W = size.width, H = size.height;
+  auto clamp = [](int64_t v, int64_t lo, int64_t hi) { return v < lo ? lo : v > hi ? hi : v; };
+  const int lo = int(clamp(-p.ix, 0, n)), hi = int(clamp(W - 1 - p.ix, lo, n));
+  const __m128 w00 = _mm_set1_ps(p.w00), w01 = _mm_set1_ps(p.w01), w10 = _mm_set1_ps(p.w10),
+               w11 = _mm_set1_ps(p.w11);
+  for (int j = 0; j < n; ++j) {
+    const Zel16s* s0 = plane + clamp(p.iy + j, 0, H - 1) * W;
+    const Zel16s* s1 = plane + clamp(p.iy + j + 1, 0, H - 1) * W;
+    double* d = dst + ptrdiff_t(j) * dstStride;
+    auto one = [&](int i) {
+      const int64_t c0 = clamp(p.ix + i, 0, W - 1), c1 = clamp(p.ix + i + 1, 0, W - 1);
+      const float v = ((float(s0[c0]) * kScale * p.w00 + float(s0[c1]) * kScale * p.w01) +
+                       float(s1[c0]) * kScale * p.w10) +
+                      float(s1[c1]) * kScale * p.w11;
+      d[i] = double(v);
+    };
+    int i = 0;
+    for (; i < lo; ++i) one(i);
+    auto four = [&](int at) {
+      const Zel16s* a0 = s0 + (p.ix + at);
+      const Zel16s* a1 = s1 + (p.ix + at);
+      __m128 v = _mm_add_ps(_mm_mul_ps(scaledLoad4(a0), w00), _mm_mul_ps(scaledLoad4(a0 + 1), w01));
+      v = _mm_add_ps(v, _mm_mul_ps(scaledLoad4(a1), w10));
+      v = _mm_add_ps(v, _mm_mul_ps(scaledLoad4(a1 + 1), w11));
+      _mm_storeu_pd(d + at, _mm_cvtps_pd(v));
+      _mm_storeu_pd(d + at + 2, _mm_cvtps_pd(_mm_movehl_ps(v, v)));
+    };
+    if (wide && hi - lo >= 8) {
+      avx2::optflowScaledInterior(s0 + (p.ix + lo), s1 + (p.ix + lo), d + lo, hi - lo, p);
+      i = hi;
     }
-    for (; x < width; ++x) {
-      ox[x] = float(dx[x]) * kScale;
-      oy[x] = float(dy[x]) * kScale;
+    for (; i + 4 <= hi; i += 4) four(i);
+    // A ragged end: the last four again, rewriting the same values.
+    if (i < hi && hi - lo >= 4) {
+      four(hi - 4);
+      i = hi;
     }
+    for (; i < n; ++i) one(i);
   }
 }
 
@@ -142,6 +182,18 @@ inline bool sameRect(ZeliRect a, ZeliRect b) {
   return a.x == b.x && a.y == b.y && a.width == b.width && a.height == b.height;
 }
 
+// The sub-pixel copy of an image window; with AVX2 a window whose taps all
+// lie inside the image (no row or column clamped) goes in one piece.
+template <typename T>
+void copyImageWindow(const LevelImage<T>& im, float* dst, int stride, int n, const subpix::Placement& p, bool wide) {
+  if (wide && n >= 8 && p.ix >= 0 && p.iy >= 0 && p.ix + n < int64_t(im.size.width) &&
+      p.iy + n < int64_t(im.size.height)) {
+    avx2::optflowInteriorWindow(im.data, im.step, dst, stride, n, p);
+    return;
+  }
+  subpix::copyWindow(im.data, im.step, im.size, dst, stride * int(sizeof(float)), {n, n}, p);
+}
+
 struct Params {
   int winSize, maxIter;
   double threshold2;
@@ -168,19 +220,26 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
     if (ri.width > 0) {
       const int bytes = w.stride * int(sizeof(float));
       if (wholeLevel) {
-        subpix::copyWindow(first.data, first.step, first.size, w.i, bytes, win, pp);
-        const int gstep = first.size.width * int(sizeof(float));
-        subpix::copyWindow<float, float>(w.gx, gstep, first.size, w.ix, bytes, win, pp);
-        subpix::copyWindow<float, float>(w.gy, gstep, first.size, w.iy, bytes, win, pp);
+        copyImageWindow(first, w.i, w.stride, n, pp, prm.wide);
+        if constexpr (std::is_same<T, Zel8u>::value) {
+          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gx), first.size, w.ixd, w.stride, n, pp, prm.wide);
+          copyScaledWindow(reinterpret_cast<const Zel16s*>(w.gy), first.size, w.iyd, w.stride, n, pp, prm.wide);
+        } else {
+          const int gstep = first.size.width * int(sizeof(float));
+          subpix::copyWindow<float, float>(w.gx, gstep, first.size, w.ix, bytes, win, pp);
+          subpix::copyWindow<float, float>(w.gy, gstep, first.size, w.iy, bytes, win, pp);
+          toDouble(w.ix, w.ixd, w.stride, n);
+          toDouble(w.iy, w.iyd, w.stride, n);
+        }
       } else {
         subpix::Placement pm = pp;
         pm.ix -= 1;
         pm.iy -= 1;
         subpix::copyWindow(first.data, first.step, first.size, w.margin, bytes, {n + 2, n + 2}, pm);
         windowGradients(w, n);
+        toDouble(w.ix, w.ixd, w.stride, n);
+        toDouble(w.iy, w.iyd, w.stride, n);
       }
-      toDouble(w.ix, w.ixd, w.stride, n);
-      toDouble(w.iy, w.iyd, w.stride, n);
     }
   }
 
@@ -195,7 +254,7 @@ bool trackPoint(const LevelImage<T>& first, const LevelImage<T>& second, bool wh
     if (!subpix::place(g, win, &pj)) return false;
     const ZeliRect rj = subpix::insideRect(pj, second.size, win);
     if (rj.width == 0) return false;
-    subpix::copyWindow(second.data, second.step, second.size, w.j, w.stride * int(sizeof(float)), win, pj);
+    copyImageWindow(second, w.j, w.stride, n, pj, prm.wide);
     const ZeliRect r = intersect(ri, rj);
     if (r.width == 0) {
       *next = g;
@@ -276,8 +335,7 @@ ZelStatus track(const ZeliPyramid* pyramid1, const ZeliPyramid* pyramid2, const 
     const bool whole = first.size.width <= state->roiSize.width && first.size.height <= state->roiSize.height;
     if (whole) levelGradients(first, w);
     const double s = pyramid1->scales[l];
-    for (int i = 0; i < numFeat; ++i) {
-      if (status[i] != active) continue;
+    auto trackOne = [&](int i) {
       status[i] = Zel8s(l);
       ZeliPoint_32f g = nextPts[i];
       float e = 0;
@@ -291,6 +349,20 @@ ZelStatus track(const ZeliPyramid* pyramid1, const ZeliPyramid* pyramid2, const 
         status[i] = active;
         error[i] = 0;
       }
+    };
+    // Points do not depend on each other: visit them in chunks, each in
+    // order of image row, so that neighbouring windows share cached rows.
+    for (int from = 0; from < numFeat; from += kChunk) {
+      int64_t order[kChunk];
+      int count = 0;
+      for (int i = from; i < numFeat && i < from + kChunk; ++i) {
+        if (status[i] != active) continue;
+        const float y = prevPts[i].y;
+        const int64_t row = std::isfinite(y) ? int64_t(y < -1e9f ? -1e9f : y > 1e9f ? 1e9f : y) : -2000000000;
+        order[count++] = row * kChunk + (i - from);
+      }
+      std::sort(order, order + count);
+      for (int k = 0; k < count; ++k) trackOne(from + int(order[k] - (order[k] >> kChunkBits) * kChunk));
     }
   }
   return zelStatusOk;

@@ -13,6 +13,7 @@
 #include <stddef.h>
 #include <stdint.h>
 
+#include "stats/subpix.h"
 #include "zelcv.h"
 
 namespace zelcv {
@@ -119,6 +120,15 @@ inline MismatchSums mismatchSums(const WindowSet& w, ZeliRect r) {
 namespace avx2 {
 optflow::GradientSums optflowGradientSums(const optflow::WindowSet& w, ZeliRect r);
 optflow::MismatchSums optflowMismatchSums(const optflow::WindowSet& w, ZeliRect r);
+// The sub-pixel window copy of an n x n window (n >= 8) whose every tap
+// lies inside the image, rows and columns unclamped: the copy's values.
+void optflowInteriorWindow(const Zel8u* src, int step, float* dst, int dstStride, int n, const subpix::Placement& p);
+void optflowInteriorWindow(const Zel16u* src, int step, float* dst, int dstStride, int n, const subpix::Placement& p);
+void optflowInteriorWindow(const Zel32f* src, int step, float* dst, int dstStride, int n, const subpix::Placement& p);
+// Columns [0, count) (count >= 8) of a window row read from a 16-bit
+// derivative plane, the taps scaled by 1/32 as optflow.cpp's copy scales
+// them, stored as doubles; a0 and a1 point at the row's first taps.
+void optflowScaledInterior(const Zel16s* a0, const Zel16s* a1, double* d, int count, const subpix::Placement& p);
 }  // namespace avx2
 }  // namespace zelcv
 

@@ -68,7 +68,69 @@ struct Envelope {
   double* start;       // where it starts to be the lowest; one more entry than parabolas
 };
 
+// Square roots of a row of squared distances, all below 2^24 and so exact in
+// single precision: the single-precision root of such an integer is the
+// float nearest to its exact root.
+void rootsOfSmallSquares(float* g, int w) {
+  int x = 0;
+  for (; x + 4 <= w; x += 4) _mm_storeu_ps(g + x, _mm_sqrt_ps(_mm_loadu_ps(g + x)));
+  for (; x < w; ++x) g[x] = sqrtf(g[x]);
+}
+
+// The envelope in integers, for rows and columns up to 2^20 long: parabola k
+// (site p, f = g^2 + p^2) is the lowest from (f_k - f_{k-1}) / (2 (p_k -
+// p_{k-1})) on, and two such breakpoints compare by cross-multiplying, exact
+// in 64 bits at these sizes -- no division, and no rounding to reason about.
+void envelopeRowExact(float* g, int w, int32_t* site, int64_t* f) {
+  int k = -1;
+  for (int q = 0; q < w; ++q) {
+    if (g[q] == FLT_MAX) continue;  // no feature in this column
+    const int64_t gq = int64_t(g[q]), fq = gq * gq + int64_t(q) * q;
+    // Drop the parabolas that the new one hides: those whose breakpoint is
+    // not left of the new one's with them. The first starts at -infinity.
+    while (k > 0) {
+      const int64_t n = fq - f[k], d = 2 * int64_t(q - site[k]);
+      const int64_t nk = f[k] - f[k - 1], dk = 2 * int64_t(site[k] - site[k - 1]);
+      if (n * dk > nk * d) break;
+      --k;
+    }
+    ++k;
+    site[k] = q;
+    f[k] = fq;
+  }
+  if (k < 0) return;  // no feature anywhere: the row keeps the largest float
+  // Squared distances below 2^24 are exact in single precision, and rooted
+  // in one pass; from the first larger one on, the row takes double roots.
+  bool small = true;
+  int j = 0;
+  // The current parabola and its successor's breakpoint, kept in registers.
+  int64_t fj = f[0], twoSite = 2 * int64_t(site[0]), nextN = 0, nextD = 0;
+  auto follow = [&]() {
+    if (j < k) {
+      nextN = f[j + 1] - f[j];
+      nextD = 2 * int64_t(site[j + 1] - site[j]);
+    }
+  };
+  follow();
+  for (int x = 0; x < w; ++x) {
+    while (j < k && int64_t(x) * nextD >= nextN) {
+      ++j;
+      fj = f[j];
+      twoSite = 2 * int64_t(site[j]);
+      follow();
+    }
+    const int64_t d2 = fj + int64_t(x) * (int64_t(x) - twoSite);
+    if (small && d2 >= 16777216) {
+      small = false;
+      rootsOfSmallSquares(g, x);
+    }
+    g[x] = small ? float(d2) : float(sqrt(double(d2)));
+  }
+  if (small) rootsOfSmallSquares(g, w);
+}
+
 // One row: on entry `g` holds the column distances, on return the distances.
+// The breakpoints in double precision, for rows too long for the exact form.
 void envelopeRow(float* g, int w, const Envelope& e) {
   int k = -1;
   for (int q = 0; q < w; ++q) {
@@ -144,6 +206,14 @@ ZELCV_ENTRY(zeliTrueDistanceTransform_8u32f_C1R)(const Zel8u* src, int srcStep, 
   const Envelope e = {reinterpret_cast<int32_t*>(p + 4 * n), reinterpret_cast<float*>(p + 8 * n),
                       reinterpret_cast<double*>(p + 16 * n)};
   for (int x = 0; x < w; ++x) line[x] = FLT_MAX;
+  const bool exact = w <= (1 << 20) && h <= (1 << 20);
+  int64_t* f = reinterpret_cast<int64_t*>(e.start);
+  auto finishRow = [&](float* row) {
+    if (exact)
+      envelopeRowExact(row, w, e.site, f);
+    else
+      envelopeRow(row, w, e);
+  };
 
   const float* above = line;
   for (int y = 0; y < h; ++y) {
@@ -153,11 +223,11 @@ ZELCV_ENTRY(zeliTrueDistanceTransform_8u32f_C1R)(const Zel8u* src, int srcStep, 
   }
   // Upwards, each row finished while it is still in the cache.
   memcpy(line, rowOf(dst, dstStep, h - 1), sizeof(float) * size_t(w));
-  envelopeRow(rowOf(dst, dstStep, h - 1), w, e);
+  finishRow(rowOf(dst, dstStep, h - 1));
   for (int y = h - 2; y >= 0; --y) {
     float* out = rowOf(dst, dstStep, y);
     columnsUp(line, out, w);
-    envelopeRow(out, w, e);
+    finishRow(out);
   }
   return zelStatusOk;
 }

@@ -144,12 +144,33 @@ struct GradRuns8u {
   int nextJoin(const Row& r, int x, int to, const Row& s, int left, int right) const {
     const Derived& d = static_cast<const Derived&>(*this);
     constexpr bool kConn8 = Derived::kConn8;
+    const int last = d.width - 1;
     while (x <= to) {
       const bool block = kConn8 ? (x - 1 >= left && x + 16 <= right && x + 15 <= to) : x + 15 <= to;
       if (block) {
         const __m128i seen = load16(r.seen + x), q = load16(r.px + x);
         unsigned m = passes(q, load16(s.px + x), seen);
         if (kConn8) m |= passes(q, load16(s.px + x - 1), seen) | passes(q, load16(s.px + x + 1), seen);
+        if (m) return x + lowestSet(m);
+        x += 16;
+        continue;
+      }
+      // A short stretch (most spans of a rough picture): one block whose
+      // lanes outside x .. to, and tests against pixels outside the span,
+      // are masked off, while its loads stay inside the rows.
+      if (x >= 1 && x + 16 <= last) {
+        const __m128i seen = load16(r.seen + x), q = load16(r.px + x);
+        // Lanes i with lo <= x + i <= hi.
+        auto lanes = [x](int lo, int hi) {
+          const int a = lo - x < 0 ? 0 : lo - x, b = hi - x > 15 ? 15 : hi - x;
+          return a > b ? 0u : ((2u << b) - 1u) & ~((1u << a) - 1u);
+        };
+        const unsigned wanted = lanes(x, to);
+        unsigned m = passes(q, load16(s.px + x), seen) & lanes(left, right);
+        if (kConn8)
+          m |= (passes(q, load16(s.px + x - 1), seen) & lanes(left + 1, right + 1)) |
+               (passes(q, load16(s.px + x + 1), seen) & lanes(left - 1, right - 1));
+        m &= wanted;
         if (m) return x + lowestSet(m);
         x += 16;
         continue;

@@ -2,6 +2,7 @@
 // order of their first pixel. Runs of equal value are found with vector
 // compares, linked to the touching runs of equal value in the row above,
 // resolved in one forward pass and painted back as whole runs.
+#include <emmintrin.h>
 #include <stdint.h>
 #include <string.h>
 
@@ -80,24 +81,36 @@ namespace {
 using runs::Layout;
 using runs::Run;
 
+// n values v from p on, sixteen bytes per store (rows of 16u and 32s labels
+// may sit at any address).
+template <typename D>
+void fillValues(D* p, int n, D v) {
+  if constexpr (sizeof(D) == 1) {
+    memset(p, int(v), size_t(n));
+  } else {
+    constexpr int kPer = 16 / sizeof(D);
+    const __m128i vv = sizeof(D) == 2 ? _mm_set1_epi16(short(v)) : _mm_set1_epi32(int(v));
+    int i = 0;
+    for (; i + kPer <= n; i += kPer) _mm_storeu_si128(reinterpret_cast<__m128i*>(p + i), vv);
+    for (; i < n; ++i) p[i] = v;
+  }
+}
+
 template <typename D>
 void paintRuns(const Layout& l, D* dst, int dstStep, int w, int h, bool clearGaps) {
   for (int y = 0; y < h; ++y) {
     D* d = reinterpret_cast<D*>(reinterpret_cast<uint8_t*>(dst) + int64_t(dstStep) * y);
     int x = 0;
     for (int32_t i = l.rowStart[y]; i < l.rowStart[y + 1]; ++i) {
-      const Run& run = l.runs[i];
-      if (clearGaps)
-        for (; x < run.x0; ++x) d[x] = 0;
-      const D label = D(-(int64_t(run.parent) + 1));
-      if (sizeof(D) == 1)
-        memset(d + run.x0, int(label), size_t(run.x1 - run.x0 + 1));
-      else
-        for (x = run.x0; x <= run.x1; ++x) d[x] = label;
-      x = run.x1 + 1;
+      // Locals: the stores below could alias the run list for all the
+      // compiler knows.
+      const int x0 = l.runs[i].x0, x1 = l.runs[i].x1;
+      const D label = D(-(int64_t(l.runs[i].parent) + 1));
+      if (clearGaps) fillValues<D>(d + x, x0 - x, D(0));
+      fillValues<D>(d + x0, x1 - x0 + 1, label);
+      x = x1 + 1;
     }
-    if (clearGaps)
-      for (; x < w; ++x) d[x] = 0;
+    if (clearGaps) fillValues<D>(d + x, w - x, D(0));
   }
 }
 

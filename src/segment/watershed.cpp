@@ -6,6 +6,7 @@
 // The buffer holds one link per pixel (the level queues are singly linked
 // lists threaded through it), one queued flag per pixel, and the heads and
 // tails of the 256 levels.
+#include <emmintrin.h>
 #include <stdint.h>
 #include <string.h>
 
@@ -44,6 +45,27 @@ struct Steps {
     return m;
   }
 };
+
+// Row and column of a pixel index, by a multiplication with the reciprocal
+// of the width and a correction of its rounding, instead of a division.
+struct Locator {
+  int w;
+  double inverse;
+  explicit Locator(int width) : w(width), inverse(1.0 / width) {}
+  void operator()(int32_t idx, int& y, int& x) const {
+    y = int(double(idx) * inverse);
+    x = idx - y * w;
+    if (x < 0) {
+      --y;
+      x += w;
+    } else if (x >= w) {
+      ++y;
+      x -= w;
+    }
+  }
+};
+
+inline void prefetch(const void* p) { _mm_prefetch(static_cast<const char*>(p), _MM_HINT_T0); }
 
 struct Neighbours {
   int count;
@@ -95,21 +117,44 @@ void flood(const P& prio, M* markers, int mStep, int w, int h, bool conn8, bool 
       push(int32_t(int64_t(y) * w + x), best);
       lowest = best < lowest ? best : lowest;
     }
+  const Locator locate(w);
   for (int level = lowest; level < kLevels;) {
     const int32_t idx = head[level];
     if (idx < 0) {
       ++level;
       continue;
     }
-    head[level] = next[idx];
-    if (head[level] < 0) tail[level] = -1;
-    const int y = int(idx / w), x = int(idx - int64_t(y) * w);
+    const int32_t following = next[idx];
+    head[level] = following;
+    if (following < 0) {
+      tail[level] = -1;
+    } else {
+      // The lists run in queueing order, scattered over the image: fetch
+      // what the next pixel of this level reads while this one is worked.
+      int fy, fx;
+      locate(following, fy, fx);
+      prefetch(next + following);
+      prefetch(queued + following);
+      prefetch(prio.src + int64_t(fy) * prio.step + fx);
+      for (int dy = -1; dy <= 1; ++dy)
+        if (fy + dy >= 0 && fy + dy < h) prefetch(&mk(fy + dy, fx));
+    }
+    int y, x;
+    locate(idx, y, x);
+    // Rows y - 1, y, y + 1 of the markers; away from the edges no neighbour
+    // needs a bounds test.
+    M* rows[3] = {y > 0 ? &mk(y - 1, 0) : nullptr, &mk(y, 0), y + 1 < h ? &mk(y + 1, 0) : nullptr};
+    const bool inside = x > 0 && y > 0 && x + 1 < w && y + 1 < h;
+    auto outside = [&](int k) {
+      if (inside) return false;
+      const int nx = x + nb.dx[k], ny = y + nb.dy[k];
+      return nx < 0 || ny < 0 || nx >= w || ny >= h;
+    };
     M label = 0;
     bool conflict = false;
     for (int k = 0; k < nb.count; ++k) {
-      const int nx = x + nb.dx[k], ny = y + nb.dy[k];
-      if (nx < 0 || ny < 0 || nx >= w || ny >= h) continue;
-      const M v = mk(ny, nx);
+      if (outside(k)) continue;
+      const M v = rows[1 + nb.dy[k]][x + nb.dx[k]];
       if (!labelled(v)) continue;
       if (label == 0)
         label = v;
@@ -117,16 +162,15 @@ void flood(const P& prio, M* markers, int mStep, int w, int h, bool conn8, bool 
         conflict = true;
     }
     if (lines && conflict) {
-      mk(y, x) = boundary;
+      rows[1][x] = boundary;
       continue;
     }
-    mk(y, x) = label;
+    rows[1][x] = label;
     for (int k = 0; k < nb.count; ++k) {
-      const int nx = x + nb.dx[k], ny = y + nb.dy[k];
-      if (nx < 0 || ny < 0 || nx >= w || ny >= h) continue;
-      const int32_t nidx = int32_t(int64_t(ny) * w + nx);
-      if (queued[nidx] || mk(ny, nx) != 0) continue;
-      const int p = prio.priority(ny, nx, y, x);
+      if (outside(k)) continue;
+      const int32_t nidx = idx + nb.dy[k] * w + nb.dx[k];
+      if (queued[nidx] || rows[1 + nb.dy[k]][x + nb.dx[k]] != 0) continue;
+      const int p = prio.priority(y + nb.dy[k], x + nb.dx[k], y, x);
       push(nidx, p > level ? p : level);
     }
   }

@@ -199,6 +199,31 @@ TEST(FGMM, FreshModelHasEmptyBackgroundAndFirstFrameIsForeground) {
   EXPECT_EQ(bg, src);
 }
 
+// Two components of exactly equal weight: the one of lower index ranks
+// before the other, not the other way round. Frames A then B (learning rate
+// 0.5, no complexity) leave weights 0.5 and 0.5; a third frame B finds
+// component 1 close with 0.5 ranked before it (foreground for ratio 0.4),
+// a third frame A finds component 0 close with nothing before it
+// (background). 21 pixels wide: whole runs of eight or sixteen pixels and a
+// remainder; two components and five (three of them never used).
+TEST(FGMM, EqualWeightsRankByIndex) {
+  const ZeliSize roi{21, 2};
+  const ZeliFGMMParams p{0.5f, 16.0f, 9.0f, 0.4f, 15.0f, 4.0f, 75.0f, 0.0f};
+  for (const int K : {2, 5})
+  for (const bool againB : {true, false}) {
+    int bytes = 0;
+    ASSERT_EQ(zeliFGMMGetBufferSize_8u_C3R(roi, K, &bytes), zelStatusOk);
+    std::vector<uint8_t> block(static_cast<size_t>(bytes)), a(21 * 2 * 3, 10), b(21 * 2 * 3, 110), mask(42, 7);
+    auto* st = reinterpret_cast<ZeliFGMMState*>(block.data());
+    ASSERT_EQ(zeliFGMMInit_8u_C3R(roi, K, &p, st), zelStatusOk);
+    ASSERT_EQ(zeliFGMMForeground_8u_C3R(a.data(), 63, mask.data(), 21, roi, st), zelStatusOk);
+    ASSERT_EQ(zeliFGMMForeground_8u_C3R(b.data(), 63, mask.data(), 21, roi, st), zelStatusOk);
+    EXPECT_EQ(mask, std::vector<uint8_t>(42, 255));
+    ASSERT_EQ(zeliFGMMForeground_8u_C3R(againB ? b.data() : a.data(), 63, mask.data(), 21, roi, st), zelStatusOk);
+    EXPECT_EQ(mask, std::vector<uint8_t>(42, againB ? 255 : 0)) << K << (againB ? " components, B, B" : " components, B, A");
+  }
+}
+
 // Checks after the common ones: a state of another kind -17, another size
 // -6, parameters -7, and nothing written on failure.
 TEST(BackgroundModels, StateKindSizeAndParameterChecks) {

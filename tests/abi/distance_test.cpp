@@ -358,14 +358,16 @@ TEST(TrueDistance, ExactEuclideanDistances) {
   }
 }
 
-// Squares past 2^24 take the double-precision root.
+// Squares past 2^24 take the double-precision root; rows past 2^20 pixels
+// the breakpoints in double precision.
 TEST(TrueDistance, LongDistances) {
   std::mt19937 rng(707);
-  for (auto dims : {std::pair<int, int>{3, 4300}, {4200, 2}}) {
+  for (auto dims : {std::pair<int, int>{3, 4300}, {4200, 2}, {(1 << 20) + 37, 1}}) {
     const int w = dims.first, h = dims.second;
     TestImage<uint8_t> src({w, h, 1, 0, 0});
     for (int y = 0; y < h; ++y) std::memset(src.row(y), 1, size_t(w));
     src.at(0, 0) = 0;
+    if (w > (1 << 20)) src.at(w - 1000, 0) = src.at(w / 3, 0) = 0;
     int size = 0;
     ASSERT_EQ(zeliTrueDistanceTransformGetBufferSize_8u32f_C1R({w, h}, &size), 0);
     std::vector<Zel8u> buffer(static_cast<size_t>(size));

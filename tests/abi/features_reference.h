@@ -68,7 +68,8 @@ inline float scaleFor(int filter, int mask, int block, bool eightBit) {
 }
 
 // Scaled derivatives of every pixel. 8u: exact integers times the scale;
-// 32f: column taps then row taps in float, zero taps skipped.
+// 32f: the 32f derivative filters' sums (row taps in double, then column
+// taps in float) times the scale.
 template <typename T>
 void derivatives(const Plain<T>& src, int filter, int mask, int block, int kind, T value, Plain<float>& fx,
                  Plain<float>& fy) {
@@ -91,16 +92,20 @@ void derivatives(const Plain<T>& src, int filter, int mask, int block, int kind,
         fx.at(x, y) = float(dx) * s;
         fy.at(x, y) = float(dy) * s;
       } else {
+        // Per window row, the row taps in double (tap 0 first, every tap)
+        // rounded to float, then the column taps over those in float.
         float dx = 0.0f, dy = 0.0f;
-        for (int j = 0; j < t.k; ++j) {
-          float a = 0.0f, b = 0.0f;
-          for (int i = 0; i < t.k; ++i) {
-            const float p = float(sourcePixel(src, x - r + j, y - r + i, kind, value));
-            if (t.smooth[i] != 0.0f) a = a + t.smooth[i] * p;
-            if (t.first[i] != 0.0f) b = b + t.first[i] * p;
+        for (int i = 0; i < t.k; ++i) {
+          double a = 0.0, b = 0.0;
+          for (int j = 0; j < t.k; ++j) {
+            const double p = double(sourcePixel(src, x - r + j, y - r + i, kind, value));
+            const double pa = double(t.first[j]) * p, pb = double(t.smooth[j]) * p;
+            a = j == 0 ? pa : a + pa;
+            b = j == 0 ? pb : b + pb;
           }
-          if (t.first[j] != 0.0f) dx = dx + t.first[j] * a;
-          if (t.smooth[j] != 0.0f) dy = dy + t.smooth[j] * b;
+          const float ca = t.smooth[i] * float(a), cb = t.first[i] * float(b);
+          dx = i == 0 ? ca : dx + ca;
+          dy = i == 0 ? cb : dy + cb;
         }
         fx.at(x, y) = dx * s;
         fy.at(x, y) = dy * s;
@@ -295,6 +300,107 @@ inline std::vector<Line> hough(const Plain<uint8_t>& img, float drho, float dthe
   for (const Cell& cell : cells)
     lines.push_back({(float(cell.r) - float(rhos - 1) * 0.5f) * drho, thetaMin + float(cell.n) * dtheta});
   return lines;
+}
+
+// ---- probabilistic Hough ------------------------------------------------------------
+
+struct ProbSegment {
+  int x0, y0, x1, y1;
+};
+
+// Pixels picked by the seeded generator, votes counted cell by cell, the
+// strongest of the pixel's cells found by a scan after its vote, segments
+// walked in 16-bit fixed point.
+inline std::vector<ProbSegment> houghProb(const Plain<uint8_t>& img, float drho, float dtheta, uint32_t seed,
+                                          int threshold, int length, int gap, int capacity) {
+  const int rhos = int(std::nearbyint(float(2 * (img.w + img.h) + 1) / drho));
+  const int angles = int(std::nearbyint(3.14159265358979323846 / double(dtheta)));
+  const int offset = (rhos - 1) / 2;
+  const float irho = 1.0f / drho;
+  std::vector<float> c(angles), s(angles);
+  float a = 0.0f;
+  for (int n = 0; n < angles; ++n, a += dtheta) {
+    c[n] = float(std::cos(double(a)) * irho);
+    s[n] = float(std::sin(double(a)) * irho);
+  }
+  std::vector<int> acc(size_t(angles) * rhos, 0);
+  auto cell = [&](int n, int x, int y) -> int& {
+    return acc[size_t(n) * rhos + size_t(int(std::nearbyint(float(x) * c[n] + float(y) * s[n])) + offset)];
+  };
+  std::vector<uint8_t> mask(size_t(img.w) * img.h, 0);  // 0 empty, 1 set, 2 voted
+  std::vector<std::pair<int, int>> list;
+  for (int y = 0; y < img.h; ++y)
+    for (int x = 0; x < img.w; ++x)
+      if (img.at(x, y)) {
+        mask[size_t(y) * img.w + x] = 1;
+        list.push_back({x, y});
+      }
+  uint64_t state = uint64_t(seed) ^ 0x9E3779B97F4A7C15ull;
+  if (!state) state = 0x9E3779B97F4A7C15ull;
+  std::vector<ProbSegment> out;
+  while (!list.empty() && int(out.size()) < capacity) {
+    state ^= state >> 12;
+    state ^= state << 25;
+    state ^= state >> 27;
+    const uint32_t r = uint32_t((state * 0x2545F4914F6CDD1Dull) >> 32);
+    const size_t pick = r % uint32_t(list.size());
+    const int px = list[pick].first, py = list[pick].second;
+    list[pick] = list.back();
+    list.pop_back();
+    uint8_t& here = mask[size_t(py) * img.w + px];
+    if (!here) continue;
+    for (int n = 0; n < angles; ++n) cell(n, px, py)++;
+    here = 2;
+    int best = threshold - 1, bestAngle = -1;
+    for (int n = 0; n < angles; ++n)
+      if (cell(n, px, py) > best) {
+        best = cell(n, px, py);
+        bestAngle = n;
+      }
+    if (bestAngle < 0) continue;
+    const float theta = float(bestAngle) * dtheta;
+    const float ax = -std::sin(theta), ay = std::cos(theta);
+    const bool alongX = std::fabs(ax) > std::fabs(ay);
+    int dx, dy, x0, y0;
+    if (alongX) {
+      dx = ax > 0 ? 1 : -1;
+      dy = int(std::lround(ay * 65536 / std::fabs(ax)));
+      x0 = px;
+      y0 = (py << 16) + (1 << 15);
+    } else {
+      dy = ay > 0 ? 1 : -1;
+      dx = int(std::lround(ax * 65536 / std::fabs(ay)));
+      x0 = (px << 16) + (1 << 15);
+      y0 = py;
+    }
+    auto pixel = [&](int fx, int fy) { return alongX ? std::make_pair(fx, fy >> 16) : std::make_pair(fx >> 16, fy); };
+    std::pair<int, int> end[2] = {{px, py}, {px, py}};
+    for (int k = 0; k < 2; ++k) {
+      int misses = 0;
+      for (int fx = x0, fy = y0;; fx += k ? -dx : dx, fy += k ? -dy : dy) {
+        const auto q = pixel(fx, fy);
+        if (q.first < 0 || q.first >= img.w || q.second < 0 || q.second >= img.h) break;
+        if (mask[size_t(q.second) * img.w + q.first]) {
+          misses = 0;
+          end[k] = q;
+        } else if (++misses > gap) {
+          break;
+        }
+      }
+    }
+    if (std::abs(end[1].first - end[0].first) < length && std::abs(end[1].second - end[0].second) < length) continue;
+    for (int k = 0; k < 2; ++k)
+      for (int fx = x0, fy = y0;; fx += k ? -dx : dx, fy += k ? -dy : dy) {
+        const auto q = pixel(fx, fy);
+        uint8_t& m = mask[size_t(q.second) * img.w + q.first];
+        if (m == 2)
+          for (int n = 0; n < angles; ++n) cell(n, q.first, q.second)--;
+        m = 0;
+        if (q == end[k]) break;
+      }
+    out.push_back({end[0].first, end[0].second, end[1].first, end[1].second});
+  }
+  return out;
 }
 
 // ---- line suppression ---------------------------------------------------------------

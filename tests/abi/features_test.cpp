@@ -267,7 +267,9 @@ TEST(FeaturesFast, MatchesReference) {
   ASSERT_EQ(zeliFastNGetSize(&stateBytes), zelStatusOk);
   int corners = 0;
   for (int round = 0; round < 150; ++round) {
-    Layout layout = zeltest::randomLayout(rng, 70, 30, 1, 1, 1);
+    // Widths up to 110: rows of one, two and three 32-centre blocks with an
+    // overlapping last block, and rows too narrow for any block.
+    Layout layout = zeltest::randomLayout(rng, 110, 30, 1, 1, 1);
     TestImage<Zel8u> src(layout);
     if (round % 2) fillScene(src, rng, 30);
     else src.fillRandom(rng, 0, 255);
@@ -486,6 +488,32 @@ TEST(FeaturesHoughProb, FindsSegmentsReproducibly) {
     ASSERT_EQ(one.size(), 1u);
     EXPECT_EQ(again, zelStatusOutputFull);
     EXPECT_TRUE(std::memcmp(&one[0], &segments[0], sizeof(Segment)) == 0);
+  }
+}
+
+TEST(FeaturesHoughProb, MatchesReference) {
+  std::mt19937 rng(73);
+  for (int round = 0; round < 40; ++round) {
+    Layout layout = zeltest::randomLayout(rng, 150, 90, 1, 1, 1);
+    TestImage<Zel8u> src(layout);
+    const int density = 5 + int(rng() % 60);
+    for (int y = 0; y < layout.height; ++y)
+      for (int x = 0; x < layout.width; ++x) src.at(x, y) = rng() % density == 0 ? Zel8u(1 + rng() % 255) : 0;
+    for (int k = int(rng() % 6); k > 0; --k)
+      drawLine(src, int(rng() % layout.width), int(rng() % layout.height), int(rng() % layout.width),
+               int(rng() % layout.height));
+    const unsigned seed = unsigned(rng());
+    const int threshold = 1 + int(rng() % 25), length = int(rng() % 30), gap = int(rng() % 5);
+    const int capacity = round % 5 == 0 ? 1 + int(rng() % 3) : 400;
+    ZelStatus status;
+    const auto got = probLines(src, seed, threshold, length, gap, capacity, &status);
+    const auto want = featref::houghProb(plainOf(src), 1.0f, float(3.14159265358979323846 / 180), seed, threshold,
+                                         length, gap, capacity);
+    ASSERT_EQ(got.size(), want.size()) << "round " << round;
+    for (size_t i = 0; i < got.size(); ++i)
+      ASSERT_TRUE(got[i].x0 == want[i].x0 && got[i].y0 == want[i].y0 && got[i].x1 == want[i].x1 &&
+                  got[i].y1 == want[i].y1)
+          << "round " << round << " segment " << i;
   }
 }
 

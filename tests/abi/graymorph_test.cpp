@@ -1,7 +1,8 @@
 // Grey-level dilation and erosion through the exported interface: against a
 // brute-force maximum (minimum) of pixel plus (minus) structuring value over
-// random functions, anchors, ROI sizes, steps, offsets, border forms and in
-// place; flat functions against our flat morphology; the state's checks.
+// random functions (some of them sums of a row and a column part), anchors,
+// ROI sizes, steps, offsets, border forms and in place; flat functions
+// against our flat morphology; the state's checks.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -45,6 +46,26 @@ template <> struct Gray<Zel8u> {
     }
   }
   static void fill(TestImage<Zel8u>& im, std::mt19937& rng) { im.fillRandom(rng, 0, rng() % 4 ? 255 : 3); }
+  // A sum of a column part and a row part, v(i, j) = g(i) + h(j): all
+  // values <= 0 (paraboloids, cones), all >= 0, or of both signs; sums past
+  // -255 or 255 sometimes written as far larger values, which act the same.
+  static void makeSum(std::vector<Value>& f, int mw, int mh, std::mt19937& rng) {
+    const int sign = randomIn(rng, 0, 2);
+    const int reach = rng() % 3 ? 40 : 300;
+    std::vector<int> g(static_cast<size_t>(mw)), h(static_cast<size_t>(mh));
+    auto part = [&] {
+      return sign == 0 ? -randomIn(rng, 0, reach) : sign == 1 ? randomIn(rng, 0, reach) : randomIn(rng, -20, 20);
+    };
+    for (int& v : g) v = part();
+    for (int& v : h) v = part();
+    for (int j = 0; j < mh; ++j)
+      for (int i = 0; i < mw; ++i) {
+        Value v = g[size_t(i)] + h[size_t(j)];
+        if (v <= -255 && rng() % 2) v = -100000;
+        if (v >= 255 && rng() % 2) v = std::numeric_limits<Value>::max();
+        f[size_t(j * mw + i)] = v;
+      }
+  }
 };
 template <> struct Gray<Zel32f> {
   using Value = Zel32f;
@@ -55,6 +76,13 @@ template <> struct Gray<Zel32f> {
   static constexpr auto dilate = zeliGrayDilateBorder_32f_C1R;
   static constexpr auto erode = zeliGrayErodeBorder_32f_C1R;
   static Value off() { return -std::numeric_limits<float>::infinity(); }
+  static void makeSum(std::vector<Value>& f, int mw, int mh, std::mt19937& rng) {
+    std::vector<float> g(static_cast<size_t>(mw)), h(static_cast<size_t>(mh));
+    for (float& v : g) v = -std::uniform_real_distribution<float>(0.0f, 30.0f)(rng);
+    for (float& v : h) v = -std::uniform_real_distribution<float>(0.0f, 30.0f)(rng);
+    for (int j = 0; j < mh; ++j)
+      for (int i = 0; i < mw; ++i) f[size_t(j * mw + i)] = g[size_t(i)] + h[size_t(j)];
+  }
   static Value randomValue(std::mt19937& rng) {
     switch (rng() % 10) {
       case 0: return off();
@@ -150,6 +178,7 @@ TYPED_TEST(GrayMorph, MatchesBruteForceOverRandomCases) {
     const ZeliPoint anchor = {randomIn(rng, 0, mw - 1), randomIn(rng, 0, mh - 1)};
     std::vector<typename G::Value> f(size_t(mw * mh));
     for (auto& v : f) v = G::randomValue(rng);
+    if (rng() % 3 == 0) G::makeSum(f, mw, mh, rng);
     const int border = kBorders[rng() % 10];
     const int maxWidth = roi.width + randomIn(rng, 0, 20);
 

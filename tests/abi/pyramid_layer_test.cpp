@@ -193,6 +193,59 @@ TEST(PyramidLayer, MatchesReference) {
   compareLayers<Zel32f>(ZELTEST_LAYER_FNS(32f_C3R), 3, 26);
 }
 
+// Halving 8u images: kernels whose sums stay integral (the binomial ones in
+// any scale, others within 16-bit taps) and kernels that do not, rows wide
+// enough for the vector steps, images below three rows or columns, and
+// sources narrower than the state's base, whose destination comes from the
+// chain rather than from halving.
+TEST(PyramidLayer, HalvingEightBitMatchesReference) {
+  const std::vector<std::vector<Zel16s>> kernels = {
+      {1, 4, 6, 4, 1}, {3, 12, 18, 12, 3}, {1, 4, 6, 5, 9}, {1, 2, 1},       {2, 7, 12, 20, 12, 7, 2},
+      {1, 4, 7, 4, 1}, {-3, 10, 40, 10, -3}, {200, -199, 3, -199, 200}, {9, 30000, 9}};
+  std::mt19937 rng(31);
+  for (int trial = 0; trial < 120; ++trial) {
+    const std::vector<Zel16s>& kernel = kernels[trial % kernels.size()];
+    const int channels = trial % 4 == 3 ? 3 : 1;
+    const int K = int(kernel.size());
+    Layout l = zeltest::randomLayout(rng, trial % 5 == 0 ? 4 : 300, trial % 5 == 0 ? 4 : 24, channels, 1, 1);
+    TestImage<Zel8u> src(l);
+    fill(src, rng);
+    // A third of the states are built for a wider base of the same height.
+    const ZeliSize base = {l.width + (trial % 3 == 0 ? int(rng() % 20) : 0), l.height};
+    ZeliSize dsz;
+    ZeliPyramidLayerState* st = nullptr;
+    ASSERT_EQ(zeliGetPyramidDownROI(base, &dsz, 2.0f), zelStatusOk);
+    SCOPED_TRACE(testing::Message() << l.width << "x" << l.height << " base " << base.width << " C" << channels
+                                    << " kernel " << trial % kernels.size());
+    Layout o = zeltest::randomLayout(rng, 1, 1, channels, 1, 1);
+    o.width = dsz.width;
+    o.height = dsz.height;
+    TestImage<Zel8u> dst(o);
+    auto init = channels == 1 ? zeliPyramidLayerDownInitAlloc_8u_C1R : zeliPyramidLayerDownInitAlloc_8u_C3R;
+    auto down = channels == 1 ? zeliPyramidLayerDown_8u_C1R : zeliPyramidLayerDown_8u_C3R;
+    ASSERT_EQ(init(&st, base, 2.0f, kernel.data(), K, 2), zelStatusOk);
+    ASSERT_EQ(down(src.data(), src.step(), src.size(), dst.data(), dst.step(), dsz, st), zelStatusOk);
+    EXPECT_EQ(zeliPyramidLayerDownFree_8u_C1R(st), zelStatusOk);
+    const std::vector<Zel8u> want = referenceLayer(src, dsz.width, dsz.height, appliedTaps<Zel8u>(kernel), 2.0f, true);
+    for (int y = 0; y < dsz.height; ++y)
+      ASSERT_EQ(std::memcmp(dst.row(y), &want[size_t(y) * dsz.width * channels], size_t(dsz.width) * channels), 0)
+          << "row " << y;
+    ASSERT_TRUE(dst.sentinelIntact());
+    // The binomial taps give the 5x5 reduction's results.
+    if (trial % kernels.size() < 2 && l.width >= 3 && l.height >= 3 && base.width == l.width) {
+      int bytes = 0;
+      ASSERT_EQ(zeliPyrDownGetBufSize_Gauss5x5(l.width, 1, channels, &bytes), zelStatusOk);
+      std::vector<Zel8u> buffer(static_cast<size_t>(bytes));
+      std::vector<Zel8u> gauss(size_t(dsz.width) * dsz.height * channels);
+      const int gStep = dsz.width * channels;
+      ASSERT_EQ((channels == 1 ? zeliPyrDown_Gauss5x5_8u_C1R : zeliPyrDown_Gauss5x5_8u_C3R)(
+                    src.data(), src.step(), gauss.data(), gStep, src.size(), buffer.data()),
+                zelStatusOk);
+      EXPECT_EQ(gauss, want);
+    }
+  }
+}
+
 // A normalised kernel keeps a flat image flat, at rate 2 and elsewhere.
 TEST(PyramidLayer, FlatImageStaysFlat) {
   const Zel16s kernel[5] = {1, 4, 6, 4, 1};

@@ -168,7 +168,8 @@ T randomValue(R& rng, bool wide) {
 // Kernels of three kinds: small taps, full-range taps, and integer taps
 // whose absolute sum sits on either side of the limits below which the
 // library may form single-precision sums with exact integer arithmetic
-// (sum|tap| x 255 < 2^15 or 2^24 for 8-bit data, x 32768 < 2^24 for 16s).
+// (sum|tap| x 255 < 2^15, 2^16 with taps >= 0, or 2^24 for 8-bit data,
+// x 32768 < 2^24 for 16s).
 enum class TapKind { small, wide, boundary };
 
 template <typename Tap, typename R>
@@ -177,8 +178,8 @@ std::vector<Tap> randomKernel(R& rng, int size, TapKind kind) {
   if constexpr (std::is_floating_point<Tap>::value) {
     for (Tap& t : kernel) t = Tap(std::uniform_real_distribution<double>(-2.0, 2.0)(rng));
   } else {
-    static const int kLimits[] = {128, 129, 511, 512, 65792, 65793};
-    int target = kLimits[rng() % 6];
+    static const int kLimits[] = {128, 129, 257, 258, 511, 512, 65792, 65793};
+    int target = kLimits[rng() % 8];
     if (kind == TapKind::boundary && (target + size - 1) / size > 32767) target = 512;
     for (int k = 0; k < size; ++k) {
       int v = kind == TapKind::wide    ? std::uniform_int_distribution<int>(-32768, 32767)(rng)

@@ -94,12 +94,12 @@ Camera drawCamera(std::mt19937& rng, int width, int height) {
 }
 
 template <typename T>
-void checkRemap(const Members<T>& m, std::mt19937& rng, int trial) {
+void checkRemap(const Members<T>& m, std::mt19937& rng, int trial, int maxWidth = 70, int maxHeight = 5) {
   const int ch = m.channels;
   const int stepMultiple = int(sizeof(T));
   TestImage<T> src(zeltest::randomLayout(rng, 24, 12, ch, stepMultiple, stepMultiple));
   fillSource(src, rng);
-  const Layout dl = zeltest::randomLayout(rng, 70, 5, ch, stepMultiple, stepMultiple);
+  const Layout dl = zeltest::randomLayout(rng, maxWidth, maxHeight, ch, stepMultiple, stepMultiple);
   Layout ml = dl;
   ml.channels = 1;
   ml.padBytes = std::uniform_int_distribution<int>(0, 5)(rng) * 4;
@@ -136,6 +136,16 @@ TEST(Undistort, RemapMatchesReference) {
   for (int trial = 0; trial < 300; ++trial) {
     for (const auto& m : k8u) checkRemap(m, rng, trial);
     for (const auto& m : k32f) checkRemap(m, rng, trial);
+  }
+}
+
+// Regions several tiles wide and high, with partial tiles at the right and
+// bottom.
+TEST(Undistort, RemapLargeRegionsMatchReference) {
+  std::mt19937 rng(77);
+  for (int trial = 0; trial < 12; ++trial) {
+    for (const auto& m : k8u) checkRemap(m, rng, trial, 700, 40);
+    for (const auto& m : k32f) checkRemap(m, rng, trial, 700, 40);
   }
 }
 
