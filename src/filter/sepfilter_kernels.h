@@ -240,7 +240,9 @@ struct LowScale {
   static LowScale of(int divisor) {
     LowScale s;
     s.unit = divisor == 1;
-    if (!s.unit) s.r = static_cast<int16_t>(static_cast<int>(16384.0f / static_cast<float>(divisor)));
+    // The scale is made before the checks run; a divisor of 0, refused
+    // there, must not reach the conversion (16384 / 0 has no integer value).
+    if (!s.unit && divisor != 0) s.r = static_cast<int16_t>(static_cast<int>(16384.0f / static_cast<float>(divisor)));
     return s;
   }
   // floor(sum * r / 2^14) saturated to 16 bits, the product taken exactly.
