@@ -54,8 +54,14 @@ for config in "${configs[@]}"; do
   [[ "$config" == x86 ]] && ! runs_x86 && run_tests=0
   echo "=== $config"
   dir="build/test-$config"
+  # A build directory made with other options (another compiler, say) is
+  # started afresh: CMake does not carry a cache across such a change.
+  if [[ -e "$dir/CMakeCache.txt" && "$(cat "$dir/.options" 2> /dev/null)" != "${flags[*]}" ]]; then
+    rm -rf "$dir"
+  fi
   cmake -S . -B "$dir" "${flags[@]}" "${launcher[@]}" > "build-$config.log" 2>&1 || { cat "build-$config.log"; exit 1; }
   rm -f "build-$config.log"
+  printf '%s' "${flags[*]}" > "$dir/.options"
   if [[ "$config" == tsan ]]; then
     # Only the concurrent calls: several threads through every export at once.
     cmake --build "$dir" -j"$jobs" --target zelcv_torture_tests
