@@ -10,6 +10,12 @@
 
 #include "kernels/simd.h"
 
+// The sources are not instruction-set specific but are used by the AVX2 and
+// AVX-512 files too: an out-of-line copy compiled there would be a mergeable
+// symbol that the linker may keep for the baseline code as well, so they are
+// always inlined (the build checks the wide objects for such copies).
+#define ZELCV_ALWAYS_INLINE inline __attribute__((always_inline))
+
 namespace zelcv {
 namespace sep {
 // ---- sources -------------------------------------------------------------
@@ -21,8 +27,8 @@ template <typename S>
 struct RowSource {
   const S* base;
   int stride;
-  const S* at(int k) const { return base + k * stride; }
-  template <int N> FixedRowSource<S, N> fixed() const { return {{base, stride}}; }
+  ZELCV_ALWAYS_INLINE const S* at(int k) const { return base + k * stride; }
+  template <int N> ZELCV_ALWAYS_INLINE FixedRowSource<S, N> fixed() const { return {{base, stride}}; }
 };
 
 // The same with N taps known at compile time, for policies that cut the
@@ -36,15 +42,15 @@ struct FixedRowSource : RowSource<S> {};
 template <typename S, int N>
 struct FixedColumnSource {
   const S* rows[N];
-  const S* at(int k) const { return rows[k]; }
+  ZELCV_ALWAYS_INLINE const S* at(int k) const { return rows[k]; }
 };
 
 // Column pass: tap k reads row pointer k.
 template <typename S>
 struct ColumnSource {
   const S* const* rows;
-  const S* at(int k) const { return rows[k]; }
-  template <int N> FixedColumnSource<S, N> fixed() const {
+  ZELCV_ALWAYS_INLINE const S* at(int k) const { return rows[k]; }
+  template <int N> ZELCV_ALWAYS_INLINE FixedColumnSource<S, N> fixed() const {
     FixedColumnSource<S, N> f;
     for (int k = 0; k < N; ++k) f.rows[k] = rows[k];
     return f;
