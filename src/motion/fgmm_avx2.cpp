@@ -57,7 +57,9 @@ inline void loadPixels(const uint8_t* s, __m256* x) {
 // it.
 template <int K>
 inline __m256 processPair(float* g0, float* g1, const __m256* x, const Consts& f) {
-  __m256 w[K], e[K][3], dist[K], v[K];
+  // Read only for live components; zeroed because some optimisation levels
+  // cannot see that and warn.
+  __m256 w[K], e[K][3] = {}, dist[K] = {}, v[K] = {};
   bool live[K];
   for (int k = 0; k < K; ++k) {
     const int o = k * kFields * 4;
