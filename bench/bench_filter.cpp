@@ -62,6 +62,46 @@ void streamImage(int width, int height, int size, std::vector<std::vector<T>>& r
   (void)width;
 }
 
+// zelcv's 8u->16s pipeline over a whole image, one row pass and one column
+// pass per row through a ring, with the same kernel in both directions.
+void run8u16sPipeline(benchmark::State& state, const zelbench::Size& s, const std::vector<Zel16s>& kernel,
+                      int rowDivisor, int columnDivisor) {
+  const int size = int(kernel.size()), anchor = size / 2;
+  cv::Mat src = zelbench::naturalImage(s.width, s.height);
+  cv::Mat dst(s.height, s.width, CV_16S);
+  int rowBytes = 0, columnBytes = 0;
+  zeliFilterRowBorderPipelineGetBufferSize_8u16s_C1R({s.width, 1}, size, &rowBytes);
+  zeliFilterColumnPipelineGetBufferSize_16s_C1R({s.width, 1}, size, &columnBytes);
+  std::vector<Zel8u> rowBuffer(rowBytes), columnBuffer(columnBytes);
+  std::vector<std::vector<Zel16s>> ring(size, std::vector<Zel16s>(s.width));
+  for (auto _ : state) {
+    streamImage<Zel16s>(
+        s.width, s.height, size, ring,
+        [&](int y, Zel16s* out) {
+          zeliFilterRowBorderPipeline_8u16s_C1R(src.ptr<Zel8u>(y), zelbench::stepOf(src), &out, {s.width, 1},
+                                                kernel.data(), size, anchor, zelBorderReplicate, 0, rowDivisor,
+                                                rowBuffer.data());
+        },
+        [&](const Zel16s** rows, int y) {
+          zeliFilterColumnPipeline_16s_C1R(rows, dst.ptr<Zel16s>(y), zelbench::stepOf(dst), {s.width, 1},
+                                           kernel.data(), size, columnDivisor, columnBuffer.data());
+        });
+    benchmark::ClobberMemory();
+  }
+  state.SetBytesProcessed(int64_t(state.iterations()) * s.width * s.height * 3);
+}
+
+// OpenCV's separable filter of the same image into 16s with float kernels.
+void runCvSepFilter16s(benchmark::State& state, const zelbench::Size& s, const cv::Mat& kx, const cv::Mat& ky) {
+  cv::Mat src = zelbench::naturalImage(s.width, s.height);
+  cv::Mat dst;
+  for (auto _ : state) {
+    cv::sepFilter2D(src, dst, CV_16S, kx, ky, cv::Point(-1, -1), 0, cv::BORDER_REPLICATE);
+    benchmark::ClobberMemory();
+  }
+  state.SetBytesProcessed(int64_t(state.iterations()) * s.width * s.height * 3);
+}
+
 void registerSepFilter() {
   const zelbench::Size s = zelbench::kSizes[1];  // 1920x1080
   for (int size : {3, 5, 9}) {
@@ -71,34 +111,10 @@ void registerSepFilter() {
     zelbench::registerPair(
         "sepfilter", "8u16s/" + k,
         [=](benchmark::State& state) {
-          cv::Mat src = zelbench::naturalImage(s.width, s.height);
-          cv::Mat dst(s.height, s.width, CV_16S);
-          const std::vector<Zel16s> kernel = integerKernel(size);
           const int divisor = (size == 3 ? 4 : size == 5 ? 16 : 64);
-          int rowBytes = 0, columnBytes = 0;
-          zeliFilterRowBorderPipelineGetBufferSize_8u16s_C1R({s.width, 1}, size, &rowBytes);
-          zeliFilterColumnPipelineGetBufferSize_16s_C1R({s.width, 1}, size, &columnBytes);
-          std::vector<Zel8u> rowBuffer(rowBytes), columnBuffer(columnBytes);
-          std::vector<std::vector<Zel16s>> ring(size, std::vector<Zel16s>(s.width));
-          for (auto _ : state) {
-            streamImage<Zel16s>(
-                s.width, s.height, size, ring,
-                [&](int y, Zel16s* out) {
-                  zeliFilterRowBorderPipeline_8u16s_C1R(src.ptr<Zel8u>(y), zelbench::stepOf(src), &out,
-                                                        {s.width, 1}, kernel.data(), size, anchor,
-                                                        zelBorderReplicate, 0, 1, rowBuffer.data());
-                },
-                [&](const Zel16s** rows, int y) {
-                  zeliFilterColumnPipeline_16s_C1R(rows, dst.ptr<Zel16s>(y), zelbench::stepOf(dst), {s.width, 1},
-                                                   kernel.data(), size, divisor * divisor, columnBuffer.data());
-                });
-            benchmark::ClobberMemory();
-          }
-          state.SetBytesProcessed(int64_t(state.iterations()) * s.width * s.height * 3);
+          run8u16sPipeline(state, s, integerKernel(size), 1, divisor * divisor);
         },
         [=](benchmark::State& state) {
-          cv::Mat src = zelbench::naturalImage(s.width, s.height);
-          cv::Mat dst;
           const std::vector<Zel32f> f = floatKernel(size);
           cv::Mat kx(1, size, CV_32F), ky(1, size, CV_32F);
           const std::vector<Zel16s> kernel = integerKernel(size);
@@ -106,11 +122,7 @@ void registerSepFilter() {
             kx.at<float>(i) = kernel[i];
             ky.at<float>(i) = f[i] / float(size == 3 ? 4 : size == 5 ? 16 : 64);
           }
-          for (auto _ : state) {
-            cv::sepFilter2D(src, dst, CV_16S, kx, ky, cv::Point(-1, -1), 0, cv::BORDER_REPLICATE);
-            benchmark::ClobberMemory();
-          }
-          state.SetBytesProcessed(int64_t(state.iterations()) * s.width * s.height * 3);
+          runCvSepFilter16s(state, s, kx, ky);
         });
 
     // A row divisor other than 1: the binomial row of the size normalised by
@@ -119,46 +131,15 @@ void registerSepFilter() {
     // floats, divisors applied.
     zelbench::registerPair(
         "sepfilter", "8u16s_rowdiv16/" + k,
+        [=](benchmark::State& state) { run8u16sPipeline(state, s, binomialKernel(size), 16, 1 << (size - 1)); },
         [=](benchmark::State& state) {
-          cv::Mat src = zelbench::naturalImage(s.width, s.height);
-          cv::Mat dst(s.height, s.width, CV_16S);
-          const std::vector<Zel16s> kernel = binomialKernel(size);
-          const int columnDivisor = 1 << (size - 1);
-          int rowBytes = 0, columnBytes = 0;
-          zeliFilterRowBorderPipelineGetBufferSize_8u16s_C1R({s.width, 1}, size, &rowBytes);
-          zeliFilterColumnPipelineGetBufferSize_16s_C1R({s.width, 1}, size, &columnBytes);
-          std::vector<Zel8u> rowBuffer(rowBytes), columnBuffer(columnBytes);
-          std::vector<std::vector<Zel16s>> ring(size, std::vector<Zel16s>(s.width));
-          for (auto _ : state) {
-            streamImage<Zel16s>(
-                s.width, s.height, size, ring,
-                [&](int y, Zel16s* out) {
-                  zeliFilterRowBorderPipeline_8u16s_C1R(src.ptr<Zel8u>(y), zelbench::stepOf(src), &out,
-                                                        {s.width, 1}, kernel.data(), size, anchor,
-                                                        zelBorderReplicate, 0, 16, rowBuffer.data());
-                },
-                [&](const Zel16s** rows, int y) {
-                  zeliFilterColumnPipeline_16s_C1R(rows, dst.ptr<Zel16s>(y), zelbench::stepOf(dst), {s.width, 1},
-                                                   kernel.data(), size, columnDivisor, columnBuffer.data());
-                });
-            benchmark::ClobberMemory();
-          }
-          state.SetBytesProcessed(int64_t(state.iterations()) * s.width * s.height * 3);
-        },
-        [=](benchmark::State& state) {
-          cv::Mat src = zelbench::naturalImage(s.width, s.height);
-          cv::Mat dst;
           const std::vector<Zel16s> kernel = binomialKernel(size);
           cv::Mat kx(1, size, CV_32F), ky(1, size, CV_32F);
           for (int i = 0; i < size; ++i) {
             kx.at<float>(i) = kernel[i] / 16.0f;
             ky.at<float>(i) = kernel[i] / float(1 << (size - 1));
           }
-          for (auto _ : state) {
-            cv::sepFilter2D(src, dst, CV_16S, kx, ky, cv::Point(-1, -1), 0, cv::BORDER_REPLICATE);
-            benchmark::ClobberMemory();
-          }
-          state.SetBytesProcessed(int64_t(state.iterations()) * s.width * s.height * 3);
+          runCvSepFilter16s(state, s, kx, ky);
         });
 
     zelbench::registerPair(
